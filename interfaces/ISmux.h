@@ -1,0 +1,7 @@
+// SPDX-License-Identifier: Apache-2.0
+#pragma once
+
+#include "interfaces/INamedInterface.h"
+
+// Optional host service. Obtained when present, never called.
+class ISmux : public INamedInterface {};
