@@ -1,0 +1,36 @@
+// SPDX-License-Identifier: Apache-2.0
+#pragma once
+
+#include <array>
+#include <atomic>
+#include <string>
+
+#include "protlib/LeafMutex.h"
+
+// Error codes that the driver records.
+inline constexpr int kNoErrorYet = 1;
+inline constexpr int kGeneralError = -1;
+inline constexpr int kNotPossibleNow = -3;
+inline constexpr int kConversionError = -9;
+
+// Code and text of the most recent error. Sticky: only the next error overwrites it. Any thread.
+class ErrorState {
+ public:
+  // Records an error; the text is copied. Never throws: without memory for the text it records
+  // "Out of memory" in its place.
+  void Set(int code, const char* text);
+
+  int Code() const { return code_; }
+
+  // The text handed out stays readable until kKeptTexts further errors have been recorded, so that
+  // a host thread can read it while another thread fails.
+  const char* Text() const;
+
+ private:
+  static constexpr std::size_t kKeptTexts = 16;
+
+  std::atomic<int> code_{kNoErrorYet};
+  mutable LeafMutex mutex_;
+  std::array<std::string, kKeptTexts> texts_ LOKA_GUARDED_BY(mutex_);
+  std::size_t current_ LOKA_GUARDED_BY(mutex_) = 0;
+};

@@ -1,0 +1,34 @@
+// SPDX-License-Identifier: Apache-2.0
+#include "protlib/TagList.h"
+
+#include <memory>
+
+#include "protlib/TagBase.h"
+
+void TagList::Append(TagBase* tag) {
+  Entries entry{tag};
+  const LeafLock lock(mutex_);
+  places_.emplace(tag, entry.begin());
+  entries_.splice(entries_.end(), entry);
+}
+
+void TagList::Remove(TagBase* tag) {
+  const LeafLock lock(mutex_);
+  const auto places = places_.equal_range(tag);
+  for (auto place = places.first; place != places.second; ++place) {
+    entries_.erase(place->second);
+  }
+  places_.erase(places.first, places.second);
+}
+
+void TagList::DeleteAll() {
+  Entries entries;
+  {
+    const LeafLock lock(mutex_);
+    entries.swap(entries_);
+    places_.clear();
+  }
+  for (TagBase* tag : entries) {
+    const std::unique_ptr<TagBase> owner(tag);
+  }
+}
