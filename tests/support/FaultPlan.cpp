@@ -1,0 +1,40 @@
+// SPDX-License-Identifier: Apache-2.0
+#include "tests/support/FaultPlan.h"
+
+void FaultPlan::FailNth(const std::string& operation, int nth) {
+  const std::lock_guard<std::mutex> guard(mutex_);
+  nth_[operation].insert(nth);
+}
+
+void FaultPlan::FailAlways(const std::string& operation) {
+  const std::lock_guard<std::mutex> guard(mutex_);
+  always_.insert(operation);
+}
+
+void FaultPlan::FailNthOfAll(int nth) {
+  const std::lock_guard<std::mutex> guard(mutex_);
+  nthOfAll_ = nth;
+}
+
+void FaultPlan::Clear() {
+  const std::lock_guard<std::mutex> guard(mutex_);
+  nth_.clear();
+  always_.clear();
+  counts_.clear();
+  nthOfAll_ = 0;
+  total_ = 0;
+}
+
+bool FaultPlan::IsToFail(const std::string& operation) {
+  const std::lock_guard<std::mutex> guard(mutex_);
+  const int nth = ++counts_[operation];
+  ++total_;
+  if (total_ == nthOfAll_ || always_.count(operation) != 0) return true;
+  const auto found = nth_.find(operation);
+  return found != nth_.end() && found->second.count(nth) != 0;
+}
+
+int FaultPlan::CallCount() const {
+  const std::lock_guard<std::mutex> guard(mutex_);
+  return total_;
+}
