@@ -1,0 +1,119 @@
+// SPDX-License-Identifier: Apache-2.0
+#include "driver/SerialLink.h"
+
+#include "interfaces/ISerialFactory.h"
+#include "interfaces/ISerialPort.h"
+#include "protlib/NoThrow.h"
+
+namespace {
+
+int SetupPort(ISerialPort& port, const SerialSettings& settings) {
+  return port.Setup(settings.baudrate, settings.parity, settings.dataBits, settings.stopBits,
+                    settings.mode);
+}
+
+}  // namespace
+
+bool SerialLink::Open(const std::string& portName, const SerialSettings& settings) {
+  if (connected_) {
+    return true;
+  }
+  ISerialPort* port = factory_ == nullptr ? nullptr : factory_->OpenPort(portName.c_str());
+  if (port == nullptr) {
+    return false;
+  }
+  if (SetupPort(*port, settings) == 0) {
+    Release(port);
+    return false;
+  }
+  ISerialPort* surplus = nullptr;
+  {
+    const LeafLock lock(useMutex_);
+    if (port_ == nullptr) {
+      port_ = port;
+    } else {
+      surplus = port;  // another thread opened the link meanwhile
+    }
+    connected_ = true;
+  }
+  Release(surplus);
+  return true;
+}
+
+ISerialPort* SerialLink::TakePort() {
+  const LeafLock lock(useMutex_);
+  connected_ = false;
+  return port_.exchange(nullptr);
+}
+
+void SerialLink::Release(ISerialPort* port) {
+  if (port != nullptr) {
+    factory_->ReleasePort(port);
+  }
+}
+
+void SerialLink::Close() { Release(TakePort()); }
+
+void SerialLink::CloseWithoutSemaphore() {
+  ISerialPort* port = TakePort();
+  if (port != nullptr && !KeepForPass(port)) {
+    Release(port);
+  }
+}
+
+void SerialLink::Setup(const SerialSettings& settings) {
+  const LeafLock lock(useMutex_);
+  ISerialPort* port = port_;
+  if (port != nullptr) {
+    SetupPort(*port, settings);
+  }
+}
+
+bool SerialLink::Send(const std::string& bytes) {
+  const LeafLock lock(useMutex_);
+  ISerialPort* port = port_;
+  if (port == nullptr) {
+    return false;
+  }
+  constexpr int kPortsOwnTimeout = 0;
+  port->Send(reinterpret_cast<const unsigned char*>(bytes.data()), static_cast<int>(bytes.size()),
+             kPortsOwnTimeout);
+  return true;
+}
+
+SerialLink::ReceiveResult SerialLink::Receive(unsigned char& byte, int timeoutMs) {
+  ISerialPort* port = connected_ ? port_.load() : nullptr;
+  if (port == nullptr) {
+    return ReceiveResult::kClosed;
+  }
+  return port->Receive(&byte, timeoutMs, 0) != 0 ? ReceiveResult::kByte : ReceiveResult::kTimeout;
+}
+
+void SerialLink::BeginPass() {
+  const LeafLock lock(passMutex_);
+  isPassRunning_ = true;
+}
+
+void SerialLink::EndPass() {
+  std::vector<ISerialPort*> ports;
+  {
+    const LeafLock lock(passMutex_);
+    isPassRunning_ = false;
+    ports.swap(releaseAfterPass_);
+  }
+  for (ISerialPort* port : ports) {
+    Release(port);
+  }
+}
+
+// Leaves the port to the receive pass that is running. False when none is, or without memory.
+bool SerialLink::KeepForPass(ISerialPort* port) {
+  const LeafLock lock(passMutex_);
+  if (!isPassRunning_) {
+    return false;
+  }
+  return NoThrow(false, [&] {
+    releaseAfterPass_.push_back(port);
+    return true;
+  });
+}

@@ -1,0 +1,88 @@
+// SPDX-License-Identifier: Apache-2.0
+#pragma once
+
+#include <atomic>
+#include <string>
+#include <vector>
+
+#include "driver/SerialSettings.h"
+#include "protlib/LeafMutex.h"
+
+class ISerialFactory;
+class ISerialPort;
+
+// The protocol's serial port, open or closed. Opening and closing belong under the host's port
+// semaphore, and so does each received byte, so that a port is not released while the receive task
+// waits in it; the callers take that semaphore. What the semaphore does not cover is covered here:
+// the port stays alive while a send or a set-up uses it, and while a receive pass runs that a stop
+// could not end.
+class SerialLink {
+ public:
+  // The factory may be null: the port then never opens.
+  explicit SerialLink(ISerialFactory* factory) : factory_(factory) {}
+  SerialLink(const SerialLink&) = delete;
+  SerialLink& operator=(const SerialLink&) = delete;
+  ~SerialLink() = default;
+
+  bool IsConnected() const { return connected_; }
+
+  // Opens the named port and sets it up. True when the port is open afterwards, also when it
+  // already was. A port that cannot be set up is released again.
+  bool Open(const std::string& portName, const SerialSettings& settings);
+
+  // Marks the link as closed without touching the port: a receive pass ends at its next byte.
+  void Disconnect() { connected_ = false; }
+
+  // Releases the port, if it is open, after the sends that use it. For a caller that holds the port
+  // semaphore.
+  void Close();
+
+  // The same for a caller without the port semaphore: when a receive pass is still running, the
+  // port is released at that pass's end.
+  void CloseWithoutSemaphore();
+
+  // Sets an open port up again; the result does not matter. Does nothing without a port.
+  void Setup(const SerialSettings& settings);
+
+  // Hands the bytes to the port; what becomes of them is the port's business. False when the link
+  // is closed.
+  bool Send(const std::string& bytes);
+
+  enum class ReceiveResult { kByte, kTimeout, kClosed };
+
+  // Waits for one byte, unless the link is closed. Only within a ReceivePass and under the port
+  // semaphore.
+  ReceiveResult Receive(unsigned char& byte, int timeoutMs);
+
+  // Marks one receive pass of the receive task.
+  class ReceivePass {
+   public:
+    explicit ReceivePass(SerialLink& link) : link_(link) { link_.BeginPass(); }
+    ~ReceivePass() { link_.EndPass(); }
+    ReceivePass(const ReceivePass&) = delete;
+    ReceivePass& operator=(const ReceivePass&) = delete;
+
+   private:
+    SerialLink& link_;
+  };
+
+ private:
+  ISerialPort* TakePort();
+  void BeginPass();
+  void EndPass();
+  bool KeepForPass(ISerialPort* port);
+  void Release(ISerialPort* port);
+
+  ISerialFactory* const factory_;
+  std::atomic<bool> connected_{false};
+
+  // Held while the port is used from outside the receive task, a send or a set-up in progress
+  // included: the one leaf lock that is held across a host call that can block. Nothing is locked
+  // inside it but passMutex_'s short sections.
+  LeafMutex useMutex_;
+  std::atomic<ISerialPort*> port_{nullptr};  // written under useMutex_, read by the receive task
+
+  LeafMutex passMutex_;
+  bool isPassRunning_ LOKA_GUARDED_BY(passMutex_) = false;
+  std::vector<ISerialPort*> releaseAfterPass_ LOKA_GUARDED_BY(passMutex_);
+};
