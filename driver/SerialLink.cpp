@@ -1,9 +1,10 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "driver/SerialLink.h"
 
+#include <exception>
+
 #include "interfaces/ISerialFactory.h"
 #include "interfaces/ISerialPort.h"
-#include "protlib/NoThrow.h"
 
 namespace {
 
@@ -112,8 +113,10 @@ bool SerialLink::KeepForPass(ISerialPort* port) {
   if (!isPassRunning_) {
     return false;
   }
-  return NoThrow(false, [&] {
+  try {
     releaseAfterPass_.push_back(port);
-    return true;
-  });
+  } catch (const std::exception&) {
+    return false;
+  }
+  return true;
 }

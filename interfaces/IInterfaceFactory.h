@@ -22,6 +22,4 @@ class IInterfaceFactory {
 // allocates and returns the same factory on every call; the factory lives as long as the library is
 // loaded. Any thread.
 inline constexpr const char* kGetInterfaceFactoryName = "GetInterfaceFactory";
-extern "C" {
-typedef IInterfaceFactory* (*GetInterfaceFactoryFunction)();
-}
+using GetInterfaceFactoryFunction = IInterfaceFactory* (*)();

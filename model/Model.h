@@ -2,6 +2,7 @@
 #pragma once
 
 #include <string>
+#include <utility>
 #include <vector>
 
 #include "model/MemoryType.h"
@@ -9,7 +10,7 @@
 // A kind of device: a name and the memory types that its tags can address, in the order added.
 class Model {
  public:
-  explicit Model(const std::string& name) : name_(name) {}
+  explicit Model(std::string name) : name_(std::move(name)) {}
 
   const std::string& getName() const { return name_; }
 

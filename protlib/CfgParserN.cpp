@@ -39,7 +39,7 @@ bool parseValue(const std::string& in, std::string& out) {
     text.append(in, begin, at - begin).append(1, ' ');
     begin = at + kSpaceEntity.size();
   }
-  out = text.append(in, begin, std::string::npos);
+  out = text.append(in.substr(begin));
   return true;
 }
 

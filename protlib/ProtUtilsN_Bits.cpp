@@ -12,8 +12,8 @@ bool GetBit(const unsigned char* area, int bit) {
 
 void SetBit(unsigned char* area, int bit, bool value) {
   const auto mask = static_cast<unsigned char>(1U << static_cast<unsigned int>(bit % 8));
-  unsigned char& byte = area[bit / 8];
-  byte = static_cast<unsigned char>(value ? byte | mask : byte & ~mask);
+  const unsigned char byte = area[bit / 8];
+  area[bit / 8] = static_cast<unsigned char>(value ? byte | mask : byte & ~mask);
 }
 
 }  // namespace

@@ -26,6 +26,7 @@ class WorkBuffer {
   }
   WorkBuffer(const WorkBuffer&) = delete;
   WorkBuffer& operator=(const WorkBuffer&) = delete;
+  ~WorkBuffer() = default;
 
   bool IsValid() const { return data_ != nullptr; }
   unsigned char* Data() { return data_; }
