@@ -8,6 +8,7 @@
 #include "driver/CreateProtocol_LOKA.h"
 #include "driver/MemoryTypeCatalogue.h"
 #include "driver/Tag_LOKA.h"
+#include "driver/Xml_LOKA.h"
 #include "interfaces/CompareInterface.h"
 #include "interfaces/IMultiTask2.h"
 #include "protlib/BoundedCopy.h"
@@ -66,6 +67,8 @@ const char* const* Protocol_LOKA::tagUriNames() const {
   static constexpr std::array<const char*, 4> kNames = {"node", "memorytype", "datatype", nullptr};
   return kNames.data();
 }
+
+const char* Protocol_LOKA::GetXml() const { return GetXml_LOKA(); }
 
 int Protocol_LOKA::vcsGetCapability() const { return 2; }
 

@@ -69,6 +69,10 @@ class Protocol_LOKA : public ProtocolBase {
   int ReadBlock(const ITag* tag, unsigned char* buffer, int lengthBytes) override;
   int Write(const ITag* tag, const unsigned char* value) override;
 
+  // --- console and description (Protocol_LOKA_Console.cpp, Xml_LOKA.cpp) ---
+  bool DoCommand(const char* command, char* reply, int sizeBytes) override;
+  const char* GetXml() const override;
+
   // --- receive task (Protocol_LOKA_Task.cpp) ---
   // One receive pass: at most one token, or several back to back when only a prefix frames them.
   void Task();
@@ -78,6 +82,9 @@ class Protocol_LOKA : public ProtocolBase {
   const MemoryManager& Memory() const { return memory_; }
 
  private:
+  struct ConsoleHandler;
+  enum class SendResult { kSent, kNotHex, kNotActive };
+
   // receiving
   void ReceivePass();
   SerialLink::ReceiveResult ReceiveByte(unsigned char& byte, int timeoutMs);
@@ -120,10 +127,25 @@ class Protocol_LOKA : public ProtocolBase {
   bool StageInteger(const char* name, int value, bool isAllowed);
   bool StageFramingText(const char* name, const char* text, const char* notHex);
   bool SendToken(const std::string& text);
+  SendResult TrySend(const std::string& text);
   std::string FrameForSending(const std::string& text, bool hexTokens) const;
   bool ApplyStagedSettings();
   void ApplySerialSettings(const GroupParameterReplacer& staged);
   void ApplyTokenSettings(const GroupParameterReplacer& staged);
+
+  // console
+  bool CommandHelp(const ConsoleCommand& command);
+  bool CommandConnect(const ConsoleCommand& command);
+  bool CommandGetStat(const ConsoleCommand& command);
+  bool CommandPut(const ConsoleCommand& command);
+  bool CommandGet(const ConsoleCommand& command);
+  bool CommandTokensAvailable(const ConsoleCommand& command);
+  bool CommandGetTokenLength(const ConsoleCommand& command);
+  bool CommandTokenAck(const ConsoleCommand& command);
+  bool CommandSetHexToken(const ConsoleCommand& command);
+  bool CommandSetRxGap(const ConsoleCommand& command);
+  template <FramingText Which>
+  bool CommandSetFraming(const ConsoleCommand& command);
 
   // Constant after Config.
   _LOKA::ParamManager params_;

@@ -244,16 +244,29 @@ bool Protocol_LOKA::WriteConnect(const unsigned char* data) {
 }
 
 bool Protocol_LOKA::SendToken(const std::string& text) {
-  const bool hexTokens = settings_.HexTokens();
-  if (hexTokens && !isHex(text.c_str())) {
-    SetError(kGeneralError, Texts_LOKA::kTokenNotHex);
-    return false;
-  }
-  if (!link_.IsConnected() || !link_.Send(FrameForSending(text, hexTokens))) {
-    SetError(kGeneralError, Texts_LOKA::kNotActive);
-    return false;
+  switch (TrySend(text)) {
+    case SendResult::kNotHex:
+      SetError(kGeneralError, Texts_LOKA::kTokenNotHex);
+      return false;
+    case SendResult::kNotActive:
+      SetError(kGeneralError, Texts_LOKA::kNotActive);
+      return false;
+    case SendResult::kSent:
+      break;
   }
   return true;
+}
+
+// Frames the token and hands it to the port; the port's own result does not matter.
+Protocol_LOKA::SendResult Protocol_LOKA::TrySend(const std::string& text) {
+  const bool hexTokens = settings_.HexTokens();
+  if (hexTokens && !isHex(text.c_str())) {
+    return SendResult::kNotHex;
+  }
+  if (!link_.IsConnected() || !link_.Send(FrameForSending(text, hexTokens))) {
+    return SendResult::kNotActive;
+  }
+  return SendResult::kSent;
 }
 
 std::string Protocol_LOKA::FrameForSending(const std::string& text, bool hexTokens) const {

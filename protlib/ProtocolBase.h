@@ -8,6 +8,7 @@
 #include "protlib/NoThrow.h"
 #include "protlib/TagList.h"
 
+class ConsoleCommand;
 class TagBase;
 
 // The generic half of a protocol driver: a neutral answer to every operation that a driver need not
@@ -156,6 +157,12 @@ class ProtocolBase : public IProtocol7 {
   }
 
  private:
+  class CommandTag;
+
+  bool RunCommand(const ConsoleCommand& command);
+  void CommandInfo(const ConsoleCommand& command) const;
+  void CommandRead(const ConsoleCommand& command);
+  void CommandWrite(const ConsoleCommand& command);
   bool FindArrayItem(const ITag* tag, int index) const;
   template <typename Use>
   int WithArrayItem(const ITag* tag, int index, Use use);
