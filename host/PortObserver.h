@@ -17,8 +17,7 @@ class PortObserver {
   virtual ~PortObserver() = default;
 
   // The driver has taken everything that was received and asks for more: whatever could become of
-  // those bytes has been done. Comes when the port's buffer runs empty after a byte, and once more
-  // after the first silence that follows.
+  // those bytes has been done. Comes each time the port is about to wait, also after a silence.
   virtual void OnReceivePause(const ReceiveProgress& progress) = 0;
 
   // The other end hung up or the device is gone, and the same path answers again.

@@ -148,7 +148,9 @@ int PosixSerialPort::Receive(unsigned char* byte, int timeoutMs, int /*reserved*
   }
   if (next_ == end_) {
     const CallGuard guard(&callsInside_);
-    ReportPause();
+    if (observer_ != nullptr) {
+      observer_->OnReceivePause(progress_);
+    }
     if (!WaitAndFill(Deadline::After(std::max(timeoutMs, 1)))) {
       ++progress_.silences;
       return 0;
@@ -156,15 +158,6 @@ int PosixSerialPort::Receive(unsigned char* byte, int timeoutMs, int /*reserved*
   }
   *byte = buffer_[next_++];
   return 1;
-}
-
-void PosixSerialPort::ReportPause() {
-  if (pausesToReport_ > 0) {
-    --pausesToReport_;
-    if (observer_ != nullptr) {
-      observer_->OnReceivePause(progress_);
-    }
-  }
 }
 
 bool PosixSerialPort::WaitAndFill(const Deadline& deadline) {
@@ -191,8 +184,6 @@ bool PosixSerialPort::ReadBlock(const Deadline& deadline) {
     next_ = 0;
     end_ = static_cast<std::size_t>(count);
     progress_.receivedBytes += end_;
-    // Once when these bytes are used up, once more when a silence has ended the token they began.
-    pausesToReport_ = 2;
     return true;
   }
   if (count == 0) {

@@ -78,7 +78,6 @@ class PosixSerialPort final : public ISerialPort {
   bool WaitAndFill(const Deadline& deadline);
   bool ReadBlock(const Deadline& deadline);
   bool WaitReadable(const Deadline& deadline);
-  void ReportPause();
   void Lose(const std::string& why);
   void WaitForReturn(const Deadline& deadline);
   bool TryReturn();
@@ -114,7 +113,6 @@ class PosixSerialPort final : public ISerialPort {
   std::size_t next_ = 0;
   std::size_t end_ = 0;
   ReceiveProgress progress_;
-  int pausesToReport_ = 0;
   Deadline nextReturn_ = Deadline::After(0);
   PortProblem::Kind returnProblem_ = PortProblem::Kind::kNone;
 };
