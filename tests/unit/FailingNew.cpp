@@ -1,0 +1,66 @@
+// SPDX-License-Identifier: Apache-2.0
+#include "tests/unit/FailingNew.h"
+
+#include <cstddef>
+#include <cstdlib>
+#include <new>
+
+namespace {
+
+thread_local long long allocations = 0;
+thread_local int countdown = 0;  // 0: none fails
+thread_local bool failsFromThenOn = false;
+thread_local bool failed = false;
+
+bool IsToFail() {
+  ++allocations;
+  if (countdown == 0 || --countdown != 0) {
+    return false;
+  }
+  countdown = failsFromThenOn ? 1 : 0;
+  failed = true;
+  return true;
+}
+
+void* Allocate(std::size_t sizeBytes) noexcept {
+  return IsToFail() ? nullptr : std::malloc(sizeBytes == 0 ? 1 : sizeBytes);
+}
+
+void* AllocateOrThrow(std::size_t sizeBytes) {
+  void* const memory = Allocate(sizeBytes);
+  if (memory == nullptr) {
+    throw std::bad_alloc();
+  }
+  return memory;
+}
+
+}  // namespace
+
+FailingNew::FailingNew(int nth, Mode mode) {
+  failed = false;
+  failsFromThenOn = mode == Mode::kFromThenOn;
+  countdown = nth;
+}
+
+FailingNew::~FailingNew() { countdown = 0; }
+
+bool FailingNew::HasFailed() const { return failed; }
+
+long long FailingNew::Count() { return allocations; }
+
+// The program's own allocation functions, replaced as the language allows
+// ([replacement.functions]).
+void* operator new(std::size_t sizeBytes) { return AllocateOrThrow(sizeBytes); }
+void* operator new[](std::size_t sizeBytes) { return AllocateOrThrow(sizeBytes); }
+void* operator new(std::size_t sizeBytes, const std::nothrow_t& /*tag*/) noexcept {
+  return Allocate(sizeBytes);
+}
+void* operator new[](std::size_t sizeBytes, const std::nothrow_t& /*tag*/) noexcept {
+  return Allocate(sizeBytes);
+}
+void operator delete(void* memory) noexcept { std::free(memory); }
+void operator delete[](void* memory) noexcept { std::free(memory); }
+void operator delete(void* memory, std::size_t /*sizeBytes*/) noexcept { std::free(memory); }
+void operator delete[](void* memory, std::size_t /*sizeBytes*/) noexcept { std::free(memory); }
+void operator delete(void* memory, const std::nothrow_t& /*tag*/) noexcept { std::free(memory); }
+void operator delete[](void* memory, const std::nothrow_t& /*tag*/) noexcept { std::free(memory); }
