@@ -3,7 +3,8 @@
 
 #include <gtest/gtest.h>
 
-#include <cstring>
+#include <algorithm>
+#include <memory>
 
 #include "tests/support/HexDump.h"
 
@@ -105,11 +106,10 @@ std::string ProtocolUnderTest::ReadText(const std::string& memoryType, int decla
 
 bool ProtocolUnderTest::Write(const ITag* tag, const std::string& value) {
   // Exactly as long as the tag's value, so that a read behind it is noticed by the sanitizer.
-  std::vector<unsigned char> bytes(static_cast<std::size_t>(tag->GetVarLength()));
-  if (!bytes.empty()) {
-    std::memcpy(bytes.data(), value.data(), std::min(bytes.size(), value.size()));
-  }
-  return protocol_->Write(tag, bytes.data()) != 0;
+  const auto size = static_cast<std::size_t>(tag->GetVarLength());
+  const std::unique_ptr<unsigned char[]> bytes(new unsigned char[size]());
+  std::copy_n(value.begin(), std::min(size, value.size()), bytes.get());
+  return protocol_->Write(tag, bytes.get()) != 0;
 }
 
 bool ProtocolUnderTest::WriteNumber(const std::string& memoryType, unsigned value) {

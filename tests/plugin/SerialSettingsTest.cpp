@@ -1,0 +1,493 @@
+// SPDX-License-Identifier: Apache-2.0
+// Run-time serial settings: staging, applying with SP_Done, keeping in permanent storage.
+#include "tests/plugin/PluginFixture.h"
+
+namespace {
+
+class SerialSettingsTest : public ProtocolFixture {
+ protected:
+  void Done() { EXPECT_TRUE(P().WriteFlag("SP_Done", 1)) << P().Error(); }
+  void StageEverything() {
+    EXPECT_TRUE(P().WriteNumber("SP_Baud", 19200));
+    EXPECT_TRUE(P().WriteByte("SP_Bits", 7));
+    EXPECT_TRUE(P().WriteByte("SP_Stop", 2));
+    EXPECT_TRUE(P().WriteByte("SP_Par", 2));
+    EXPECT_TRUE(P().WriteByte("SP_Mode", 1));
+    EXPECT_TRUE(P().WriteText("SP_RxPrefix", "02"));
+    EXPECT_TRUE(P().WriteText("SP_RxSuffix", "03"));
+    EXPECT_TRUE(P().WriteNumber("SP_Gap", 70));
+    EXPECT_TRUE(P().WriteText("SP_TxPrefix", "0d"));
+    EXPECT_TRUE(P().WriteText("SP_TxSuffix", "none"));
+    EXPECT_TRUE(P().WriteFlag("SP_HexTokens", 1));
+    EXPECT_TRUE(P().WriteNumber("SP_TokenQueueSize", 5));
+  }
+  // Whether a write fails and leaves the error state as it was.
+  template <class Write>
+  bool FailsInSilence(Write write) {
+    EXPECT_EQ(P()->createAlarm("x"), nullptr);
+    const bool failed = !write();
+    return failed && P().Error() == "-1 protocol does not support alarms";
+  }
+};
+
+TEST_F(SerialSettingsTest, NothingBeforeStart) {
+  ASSERT_TRUE(P().Config(Mandatory()));
+  EXPECT_FALSE(P().WriteNumber("SP_Baud", 9600));
+  EXPECT_EQ(P().Error(), "-3 Protocol not started");
+  EXPECT_FALSE(P().WriteFlag("SP_Done", 1));
+  EXPECT_EQ(P().Error(), "-3 Protocol not started");
+  EXPECT_EQ(Calls(), "");
+}
+
+TEST_F(SerialSettingsTest, StagingAndReadingBackTakesNoSemaphoreAndChangesNothing) {
+  Run();
+  StageEverything();
+  EXPECT_EQ(P().ReadNumber("SP_Baud"), 19200U);
+  EXPECT_EQ(P().ReadByte("SP_Bits"), 7U);
+  EXPECT_EQ(P().ReadByte("SP_Stop"), 2U);
+  EXPECT_EQ(P().ReadByte("SP_Par"), 2U);
+  EXPECT_EQ(P().ReadByte("SP_Mode"), 1U);
+  EXPECT_EQ(P().ReadText("SP_RxPrefix"), "02");
+  EXPECT_EQ(P().ReadText("SP_RxSuffix"), "03");
+  EXPECT_EQ(P().ReadNumber("SP_Gap"), 70U);
+  EXPECT_EQ(P().ReadText("SP_TxPrefix"), "0d");
+  EXPECT_EQ(P().ReadText("SP_TxSuffix"), "none");
+  EXPECT_TRUE(P().ReadFlag("SP_HexTokens"));
+  EXPECT_EQ(P().ReadNumber("SP_TokenQueueSize"), 5U);
+  EXPECT_FALSE(P().ReadFlag("SP_Done"));
+  EXPECT_EQ(Calls(), "");
+  EXPECT_EQ(P().ComParams(), "com1,9600,even,8,1,RS-232");
+  EXPECT_EQ(host_.Storage().Dump(), "");
+}
+
+TEST_F(SerialSettingsTest, DoneAppliesAndStoresEverythingInKeyOrder) {
+  Run();
+  StageEverything();
+  Done();
+  EXPECT_EQ(Calls(),
+            "queue.Lock\n"
+            "SetInteger LOKA baud 19200\n"
+            "SetInteger LOKA bits 7\n"
+            "SetInteger LOKA gap 70\n"
+            "SetBoolean LOKA hex_tokens true\n"
+            "SetInteger LOKA mode 1\n"
+            "SetInteger LOKA parity 2\n"
+            "SetString LOKA rx_prefix 02\n"
+            "SetString LOKA rx_suffix 03\n"
+            "SetInteger LOKA stop 2\n"
+            "SetInteger LOKA token_queue_size 5\n"
+            "SetString LOKA tx_prefix 0d\n"
+            "SetString LOKA tx_suffix none\n"
+            "Setup 19200 2 7 2 1\n"
+            "queue.Unlock\n");
+  EXPECT_EQ(P().ComParams(), "com1,19200,odd,7,2,RS-485");
+}
+
+TEST_F(SerialSettingsTest, DoneWithNothingStagedOnlyEmptiesTheQueue) {
+  Run("rx_suffix=03");
+  Receive(
+      "A\x03"
+      "B\x03");
+  EXPECT_EQ(P().ReadNumber("tokens_available"), 2U);
+  Calls();
+  Done();
+  EXPECT_EQ(Calls(), "queue.Lock\nqueue.Unlock\n");
+  EXPECT_EQ(P().ReadNumber("tokens_available"), 0U);
+}
+
+TEST_F(SerialSettingsTest, DoneDoesItsWorkForAnyValue) {
+  Run();
+  ASSERT_TRUE(P().WriteNumber("SP_Baud", 300));
+  EXPECT_TRUE(P().WriteFlag("SP_Done", 0));
+  EXPECT_EQ(P().ComParams(), "com1,300,even,8,1,RS-232");
+}
+
+TEST_F(SerialSettingsTest, DoneIsQuietAboutThePortWhenNoneOfTheFiveChanged) {
+  Run();
+  ASSERT_TRUE(P().WriteNumber("SP_Baud", 9600));
+  ASSERT_TRUE(P().WriteByte("SP_Par", 1));
+  ASSERT_TRUE(P().WriteNumber("SP_Gap", 9));
+  ASSERT_TRUE(P().WriteText("SP_RxPrefix", "02"));
+  Done();
+  EXPECT_EQ(Calls(),
+            "queue.Lock\nSetInteger LOKA baud 9600\nSetInteger LOKA gap 9\n"
+            "SetInteger LOKA parity 1\nSetString LOKA rx_prefix 02\nqueue.Unlock\n");
+}
+
+TEST_F(SerialSettingsTest, StagedValuesStayAndAreStoredAgain) {
+  Run();
+  ASSERT_TRUE(P().WriteNumber("SP_Baud", 300));
+  Done();
+  EXPECT_EQ(Calls(), "queue.Lock\nSetInteger LOKA baud 300\nSetup 300 1 8 1 0\nqueue.Unlock\n");
+  Done();
+  EXPECT_EQ(Calls(), "queue.Lock\nSetInteger LOKA baud 300\nqueue.Unlock\n");
+}
+
+TEST_F(SerialSettingsTest, TheLastStagedValueCounts) {
+  Run();
+  ASSERT_TRUE(P().WriteNumber("SP_Baud", 300));
+  ASSERT_TRUE(P().WriteNumber("SP_Baud", 600));
+  EXPECT_EQ(P().ReadNumber("SP_Baud"), 600U);
+  Done();
+  EXPECT_EQ(Calls(), "queue.Lock\nSetInteger LOKA baud 600\nSetup 600 1 8 1 0\nqueue.Unlock\n");
+}
+
+TEST_F(SerialSettingsTest, EachOfTheFiveSetsThePortUp) {
+  Run();
+  ASSERT_TRUE(P().WriteByte("SP_Par", 4));
+  Done();
+  EXPECT_EQ(host_.Log().Count("Setup 9600 4 8 1 0"), 1);
+  ASSERT_TRUE(P().WriteByte("SP_Bits", 7));
+  Done();
+  EXPECT_EQ(host_.Log().Count("Setup 9600 4 7 1 0"), 1);
+  ASSERT_TRUE(P().WriteByte("SP_Stop", 2));
+  Done();
+  EXPECT_EQ(host_.Log().Count("Setup 9600 4 7 2 0"), 1);
+  ASSERT_TRUE(P().WriteByte("SP_Mode", 2));
+  Done();
+  EXPECT_EQ(host_.Log().Count("Setup 9600 4 7 2 2"), 1);
+  ASSERT_TRUE(P().WriteNumber("SP_Baud", 115200));
+  Done();
+  EXPECT_EQ(host_.Log().Count("Setup 115200 4 7 2 2"), 1);
+  EXPECT_EQ(P().ComParams(), "com1,115200,space,7,2,RS-422");
+}
+
+// Bits and stop bits that differ from each other: neither takes the other's value when only one of
+// the settings was staged.
+TEST_F(SerialSettingsTest, BitsKeepTheirValueWhenOnlyOthersAreStaged) {
+  Run();
+  ASSERT_TRUE(P().WriteByte("SP_Stop", 2));
+  Done();
+  EXPECT_EQ(P().ComParams(), "com1,9600,even,8,2,RS-232");
+}
+
+TEST_F(SerialSettingsTest, ASetupThatFailsIsIgnored) {
+  Run();
+  ASSERT_TRUE(P().WriteNumber("SP_Baud", 300));
+  host_.Faults().FailAlways("Setup");
+  Done();
+  EXPECT_TRUE(P().ReadFlag("connect"));
+  EXPECT_EQ(P().ComParams(), "com1,300,even,8,1,RS-232");
+  EXPECT_EQ(P().Error(), "1 ");
+}
+
+TEST_F(SerialSettingsTest, AClosedPortIsSetUpByTheNextConnect) {
+  Run("autoConnect=false");
+  StageEverything();
+  Done();
+  EXPECT_EQ(Calls().find("Setup"), std::string::npos);
+  EXPECT_EQ(P().ComParams(), "com1,19200,odd,7,2,RS-485");
+  EXPECT_TRUE(P().WriteFlag("connect", 1));
+  EXPECT_EQ(Calls(),
+            "queue.Lock\nport.Lock\nOpenPort com1\nSetup 19200 2 7 2 1\nport.Unlock\n"
+            "queue.Unlock\n");
+}
+
+TEST_F(SerialSettingsTest, FramingAndHexModeApply) {
+  Run();
+  StageEverything();
+  Done();
+  Calls();
+  EXPECT_TRUE(P().WriteText("tx_token", "4142"));
+  EXPECT_EQ(Calls(), "queue.Lock\nSend 0D 41 42\nqueue.Unlock\n");
+  Receive("\x02\xAB\x03");
+  EXPECT_EQ(P().TakeTokens(), "[AB]");
+}
+
+TEST_F(SerialSettingsTest, AcceptedBaudRates) {
+  Run();
+  for (const unsigned rate :
+       {150U, 300U, 600U, 1200U, 2400U, 4800U, 9600U, 19200U, 38400U, 57600U, 115200U}) {
+    EXPECT_TRUE(P().WriteNumber("SP_Baud", rate)) << rate;
+    EXPECT_EQ(P().ReadNumber("SP_Baud"), rate);
+  }
+}
+
+TEST_F(SerialSettingsTest, RefusedBaudRates) {
+  Run();
+  ASSERT_TRUE(P().WriteNumber("SP_Baud", 600));
+  for (const unsigned rate :
+       {0U, 1U, 110U, 149U, 151U, 14400U, 115000U, 115201U, 230400U, 0xFFFFFFFFU, 0x80000000U}) {
+    EXPECT_EQ(P()->WriteBlock(nullptr, nullptr, 0), 0);
+    EXPECT_FALSE(P().WriteNumber("SP_Baud", rate)) << rate;
+    EXPECT_EQ(P().Error(), "-1 illegal baudrate intValue") << rate;
+    EXPECT_EQ(P().ReadNumber("SP_Baud"), 600U) << "nothing is staged";
+  }
+  EXPECT_EQ(Calls(), "");
+}
+
+TEST_F(SerialSettingsTest, SmallCodesAreRefusedInSilence) {
+  Run();
+  const struct {
+    const char* type;
+    unsigned lowest;
+    unsigned highest;
+  } rows[] = {{"SP_Par", 0, 4}, {"SP_Bits", 7, 8}, {"SP_Stop", 1, 2}, {"SP_Mode", 0, 2}};
+  for (const auto& row : rows) {
+    for (unsigned value = row.lowest; value <= row.highest; ++value) {
+      EXPECT_TRUE(P().WriteByte(row.type, value)) << row.type << value;
+      EXPECT_EQ(P().ReadByte(row.type), value);
+    }
+    for (unsigned value = 0; value < 256; ++value) {
+      if (value >= row.lowest && value <= row.highest) continue;
+      EXPECT_TRUE(FailsInSilence([&] { return P().WriteByte(row.type, value); }))
+          << row.type << value;
+      EXPECT_EQ(P().ReadByte(row.type), row.highest) << "nothing is staged";
+    }
+  }
+  EXPECT_EQ(Calls(), "");
+}
+
+TEST_F(SerialSettingsTest, FramingTextsMustBeHex) {
+  Run();
+  const struct {
+    const char* type;
+    const char* error;
+  } rows[] = {{"SP_RxPrefix", "-1 Rx prefix value is not hex format"},
+              {"SP_RxSuffix", "-1 Rx suffix value is not hex format"},
+              {"SP_TxPrefix", "-1 Tx prefix value is not hex format"},
+              {"SP_TxSuffix", "-1 Tx suffix value is not hex format"}};
+  for (const auto& row : rows) {
+    for (const char* text : {"02", "none", "", "0d0A", "aAbBcCdDeEfF0123456789"}) {
+      EXPECT_TRUE(P().WriteText(row.type, text)) << row.type << text;
+      EXPECT_EQ(P().ReadText(row.type), text);
+    }
+    ASSERT_TRUE(P().WriteText(row.type, "77"));
+    for (const char* text : {"2", "0g", "abc", "None", "0 ", " 0", "0x02", "\x80\x81", "none0"}) {
+      EXPECT_EQ(P()->createAlarm("x"), nullptr);
+      EXPECT_FALSE(P().WriteText(row.type, text)) << row.type << text;
+      EXPECT_EQ(P().Error(), row.error);
+      EXPECT_EQ(P().ReadText(row.type), "77") << "nothing is staged";
+    }
+  }
+  EXPECT_EQ(Calls(), "");
+}
+
+TEST_F(SerialSettingsTest, ATextMayFillItsTag) {
+  Run();
+  EXPECT_TRUE(P().WriteText("SP_RxPrefix", "0102", 4));
+  EXPECT_EQ(P().ReadText("SP_RxPrefix"), "0102");
+  // Only what lies within the tag counts.
+  EXPECT_TRUE(P().WriteText("SP_RxPrefix", "0304xx", 4));
+  EXPECT_EQ(P().ReadText("SP_RxPrefix"), "0304");
+}
+
+TEST_F(SerialSettingsTest, TextsOfAnyLength) {
+  Run();
+  for (const int length : {118, 120, 122, 126, 128, 130, 254, 256, 258, 9998}) {
+    std::string text;
+    while (text.size() < static_cast<std::size_t>(length)) text += "4A";
+    EXPECT_TRUE(P().WriteText("SP_TxPrefix", text, length)) << length;
+    EXPECT_EQ(P().ReadText("SP_TxPrefix", length + 1), text);
+  }
+}
+
+TEST_F(SerialSettingsTest, GapAndQueueSizeAreNotChecked) {
+  Run();
+  for (const unsigned value : {0U, 1U, 10001U, 0x7FFFFFFFU, 0x80000000U, 0xFFFFFFFFU}) {
+    EXPECT_TRUE(P().WriteNumber("SP_Gap", value));
+    EXPECT_EQ(P().ReadNumber("SP_Gap"), value);
+    EXPECT_TRUE(P().WriteNumber("SP_TokenQueueSize", value));
+    EXPECT_EQ(P().ReadNumber("SP_TokenQueueSize"), value);
+  }
+}
+
+TEST_F(SerialSettingsTest, AnyNonZeroByteSetsHexTokens) {
+  Run();
+  for (const unsigned value : {1U, 2U, 0x80U, 0xFFU}) {
+    EXPECT_TRUE(P().WriteFlag("SP_HexTokens", 0));
+    EXPECT_FALSE(P().ReadFlag("SP_HexTokens"));
+    EXPECT_TRUE(P().WriteFlag("SP_HexTokens", value));
+    EXPECT_TRUE(P().ReadFlag("SP_HexTokens"));
+  }
+}
+
+TEST_F(SerialSettingsTest, NotWithoutPermanentStorage) {
+  plugin_.Close();
+  protocol_.reset();
+  host_.SetAbsent("IPermanentStorage");
+  ASSERT_EQ(plugin_.Init(&host_), 1);
+  protocol_ = std::make_unique<ProtocolUnderTest>(plugin_);
+  ASSERT_TRUE(P().Config(Mandatory()));
+  ASSERT_NE(P()->Start(), 0);
+  EXPECT_FALSE(P().ReadFlag("SP_HexTokens"));
+  StageEverything();
+  Calls();
+  Done();
+  EXPECT_EQ(Calls(), "queue2.Lock\nSetup 19200 2 7 2 1\nqueue2.Unlock\n");
+  EXPECT_TRUE(P().ReadFlag("SP_HexTokens"));
+}
+
+class StoredOverridesTest : public ProtocolFixture {};
+
+TEST_F(StoredOverridesTest, WinOverTheConfiguration) {
+  host_.Storage().Put("LOKA", "baud", 38400);
+  host_.Storage().Put("LOKA", "parity", 4);
+  host_.Storage().Put("LOKA", "bits", 7);
+  host_.Storage().Put("LOKA", "stop", 2);
+  host_.Storage().Put("LOKA", "mode", 3);
+  host_.Storage().PutString("LOKA", "rx_prefix", "02");
+  host_.Storage().PutString("LOKA", "rx_suffix", "03");
+  host_.Storage().PutString("LOKA", "tx_prefix", "04");
+  host_.Storage().PutString("LOKA", "tx_suffix", "05");
+  host_.Storage().Put("LOKA", "gap", 33);
+  host_.Storage().PutBoolean("LOKA", "hex_tokens", true);
+  host_.Storage().Put("LOKA", "token_queue_size", 2);
+  ASSERT_TRUE(P().Config(Mandatory("rx_prefix=FF hex_tokens=false gap=1")));
+  ASSERT_NE(P()->Start(), 0);
+  EXPECT_EQ(Calls(),
+            "Exists LOKA baud -> 1\nGetInteger LOKA baud -> 38400\n"
+            "Exists LOKA parity -> 1\nGetInteger LOKA parity -> 4\n"
+            "Exists LOKA bits -> 1\nGetInteger LOKA bits -> 7\n"
+            "Exists LOKA stop -> 1\nGetInteger LOKA stop -> 2\n"
+            "Exists LOKA mode -> 1\nGetInteger LOKA mode -> 3\n"
+            "Exists LOKA rx_prefix -> 1\nConvertTo IPermanentStorage2 -> 0\n"
+            "GetString LOKA rx_prefix -> 02\n"
+            "Exists LOKA rx_suffix -> 1\nConvertTo IPermanentStorage2 -> 0\n"
+            "GetString LOKA rx_suffix -> 03\n"
+            "Exists LOKA tx_prefix -> 1\nConvertTo IPermanentStorage2 -> 0\n"
+            "GetString LOKA tx_prefix -> 04\n"
+            "Exists LOKA tx_suffix -> 1\nConvertTo IPermanentStorage2 -> 0\n"
+            "GetString LOKA tx_suffix -> 05\n"
+            "Exists LOKA gap -> 1\nGetInteger LOKA gap -> 33\n"
+            "Exists LOKA hex_tokens -> 1\nGetBoolean LOKA hex_tokens -> true\n"
+            "Exists LOKA token_queue_size -> 1\nGetInteger LOKA token_queue_size -> 2\n"
+            "OpenPort com1\nSetup 38400 4 7 2 3\nCreateTask 3\ntask.Start\n");
+  EXPECT_EQ(P().ReadText("SP_RxPrefix"), "02");
+  EXPECT_EQ(P().ReadNumber("SP_Gap"), 33U);
+  EXPECT_TRUE(P().ReadFlag("SP_HexTokens"));
+  EXPECT_TRUE(P().WriteText("tx_token", "41"));
+  EXPECT_EQ(host_.Log().Count("Send 04 41 05"), 1);
+}
+
+TEST_F(StoredOverridesTest, TextsThroughTheExtendedStorage) {
+  host_.Storage().SetExtended(true);
+  host_.Storage().PutString("LOKA", "rx_prefix", "02");
+  ASSERT_TRUE(P().Config(Mandatory()));
+  ASSERT_NE(P()->Start(), 0);
+  const std::string calls = Calls();
+  EXPECT_NE(calls.find("Exists LOKA rx_prefix -> 1\nConvertTo IPermanentStorage2 -> 1\n"
+                       "GetStringInto LOKA rx_prefix 256 -> 1\nExists LOKA rx_suffix -> 0\n"),
+            std::string::npos)
+      << calls;
+  EXPECT_EQ(P().ReadText("SP_RxPrefix"), "02");
+}
+
+TEST_F(StoredOverridesTest, AnExtendedReadThatFailsGivesTheEmptyText) {
+  host_.Storage().SetExtended(true);
+  host_.Storage().PutString("LOKA", "rx_prefix", std::string(300, '0'));
+  host_.Storage().PutString("LOKA", "tx_prefix", std::string(254, '4'));
+  Run("rx_prefix=FF tx_prefix=FF");
+  EXPECT_EQ(P().ReadText("SP_RxPrefix"), "") << "not the configured text";
+  EXPECT_EQ(P().ReadText("SP_TxPrefix", 300), std::string(254, '4'));
+}
+
+TEST_F(StoredOverridesTest, NumbersNeverUseTheExtendedStorage) {
+  host_.Storage().SetExtended(true);
+  host_.Storage().Put("LOKA", "baud", 300);
+  host_.Storage().PutBoolean("LOKA", "hex_tokens", true);
+  ASSERT_TRUE(P().Config(Mandatory()));
+  ASSERT_NE(P()->Start(), 0);
+  EXPECT_EQ(Calls().find("IPermanentStorage2"), std::string::npos);
+}
+
+TEST_F(StoredOverridesTest, SurviveARestartOfTheDriver) {
+  Run();
+  ASSERT_TRUE(P().WriteNumber("SP_Baud", 300));
+  ASSERT_TRUE(P().WriteText("SP_RxSuffix", "0A"));
+  ASSERT_TRUE(P().WriteFlag("SP_HexTokens", 1));
+  ASSERT_TRUE(P().WriteFlag("SP_Done", 1));
+  EXPECT_EQ(host_.Storage().Dump(),
+            "LOKA baud = 300\nLOKA hex_tokens = true\nLOKA rx_suffix = '0A'\n");
+  P()->Stop();
+  ProtocolUnderTest next(plugin_);
+  ASSERT_TRUE(next.Config(Mandatory()));
+  ASSERT_NE(next->Start(), 0);
+  EXPECT_EQ(next.ComParams(), "com1,300,even,8,1,RS-232");
+  EXPECT_EQ(next.ReadText("SP_RxSuffix"), "0A");
+  EXPECT_TRUE(next.ReadFlag("SP_HexTokens"));
+  next->Stop();
+}
+
+TEST_F(StoredOverridesTest, OnlyDoneStores) {
+  Run();
+  ASSERT_TRUE(P().WriteNumber("SP_Baud", 300));
+  P()->Stop();
+  P().Delete();
+  EXPECT_EQ(host_.Storage().Dump(), "");
+}
+
+TEST_F(StoredOverridesTest, EachIdentHasItsOwn) {
+  P()->SetIdent("one");
+  Run();
+  ASSERT_TRUE(P().WriteNumber("SP_Gap", 11));
+  ASSERT_TRUE(P().WriteFlag("SP_Done", 1));
+  EXPECT_EQ(host_.Storage().Dump(), "one gap = 11\n");
+  ProtocolUnderTest other(plugin_);
+  other->SetIdent("two");
+  ASSERT_TRUE(other.Config(Mandatory("port=com2")));
+  ASSERT_NE(other->Start(), 0);
+  EXPECT_EQ(other.ReadNumber("SP_Gap"), 0U);
+  other->Stop();
+}
+
+// Stored framing texts are never checked; each character counts its digit value, and an odd text
+// takes its terminating zero as the last digit.
+TEST_F(StoredOverridesTest, AnyStoredTextIsTurnedIntoBytes) {
+  const struct {
+    const char* text;
+    const char* sent;
+  } rows[] = {{"", "Send 58"},
+              {"none", "Send 58"},
+              {"41", "Send 41 58"},
+              {"aF", "Send AF 58"},
+              {"Af", "Send AF 58"},
+              {"4", "Send E9 58"},
+              {"414", "Send 41 E9 58"},
+              {"zz", "Send 53 58"},
+              {"0g", "Send 10 58"},
+              {"G0", "Send 00 58"},
+              {"\xFF"
+               "0",
+               "Send 80 58"},
+              {"None", "Send 88 7E 58"}};
+  for (const auto& row : rows) {
+    host_.Storage().PutString("LOKA", "tx_prefix", row.text);
+    ProtocolUnderTest protocol(plugin_);
+    ASSERT_TRUE(protocol.Config(Mandatory()));
+    ASSERT_NE(protocol->Start(), 0);
+    Calls();
+    EXPECT_TRUE(protocol.WriteText("tx_token", "X"));
+    const std::string calls = Calls();
+    EXPECT_NE(calls.find(std::string(row.sent) + "\n"), std::string::npos) << row.text << calls;
+    protocol->Stop();
+  }
+}
+
+TEST_F(StoredOverridesTest, WrongTypesGiveZeroAndEmpty) {
+  host_.Storage().PutString("LOKA", "baud", "300");
+  host_.Storage().Put("LOKA", "rx_prefix", 2);
+  host_.Storage().Put("LOKA", "hex_tokens", 1);
+  host_.Storage().PutBoolean("LOKA", "token_queue_size", true);
+  Run("rx_prefix=FF hex_tokens=true rx_suffix=03");
+  EXPECT_EQ(P().ReadNumber("SP_Baud"), 0U);
+  EXPECT_EQ(P().ReadText("SP_RxPrefix"), "");
+  EXPECT_FALSE(P().ReadFlag("SP_HexTokens"));
+  EXPECT_EQ(P().ReadNumber("SP_TokenQueueSize"), 0U);
+  Receive(
+      "A\x03"
+      "B\x03");
+  EXPECT_EQ(P().TakeTokens(), "[B]");
+}
+
+TEST_F(StoredOverridesTest, AnUnterminatedStoredTextIsCutAtTheBuffer) {
+  host_.Storage().SetExtended(true);
+  host_.Storage().SetUnterminated(true);
+  host_.Storage().PutString("LOKA", "tx_prefix", "any");
+  Run();
+  const std::string text = P().ReadText("SP_TxPrefix", 2000);
+  EXPECT_LE(text.size(), 256U);
+  EXPECT_EQ(text, std::string(text.size(), 'A'));
+}
+
+}  // namespace
