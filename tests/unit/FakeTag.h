@@ -11,24 +11,13 @@
 // A tag whose every answer the test sets. Counts the tags that live.
 class FakeTag : public TagBase {
  public:
-  FakeTag() { ++living_; }
-  FakeTag(const FakeTag& other)
-      : TagBase(other),
-        byteOffset(other.byteOffset),
-        bitIndex(other.bitIndex),
-        type(other.type),
-        length(other.length),
-        itemType(other.itemType),
-        uri(other.uri),
-        hasName(other.hasName) {
-    ++living_;
-  }
+  FakeTag() = default;
+  FakeTag(const FakeTag& other) = default;
   FakeTag& operator=(const FakeTag&) = delete;
-  ~FakeTag() override { --living_; }
+  ~FakeTag() override = default;
 
   // A tag of a data type as a URI would write it, conversions included.
   explicit FakeTag(const std::string& spec) {
-    ++living_;
     std::vector<std::string> conversions;
     if (ProtUtilsN::GetVADOType(spec, type, itemType, length, conversions)) {
       conversions_ = std::move(conversions);
@@ -48,7 +37,7 @@ class FakeTag : public TagBase {
   }
   const std::vector<std::string>& Conversions() const { return conversions_; }
 
-  static int Living() { return living_; }
+  static int Living() { return Life::count; }
 
   unsigned int byteOffset = 0;
   int bitIndex = 0;
@@ -59,5 +48,13 @@ class FakeTag : public TagBase {
   bool hasName = true;
 
  private:
-  static inline int living_ = 0;
+  // Counts also when the constructor of the tag itself is left by an exception.
+  struct Life {
+    Life() { ++count; }
+    Life(const Life& /*other*/) { ++count; }
+    Life& operator=(const Life&) = delete;
+    ~Life() { --count; }
+    static inline int count = 0;
+  };
+  Life life_;
 };
