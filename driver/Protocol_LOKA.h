@@ -2,6 +2,7 @@
 #pragma once
 
 #include <atomic>
+#include <mutex>
 #include <string>
 #include <string_view>
 
@@ -170,4 +171,8 @@ class Protocol_LOKA : public ProtocolBase {
   TokenFramer framer_;
 
   TaskRunner_LOKA taskRunner_;
+
+  // Lets Start and Stop of several host threads run one after the other. Outermost of all locks; no
+  // other operation and no task takes it.
+  std::mutex lifeMutex_;
 };

@@ -104,6 +104,7 @@ void Protocol_LOKA::ClosePortUnderSemaphore() {
 }
 
 int Protocol_LOKA::Start() {
+  const std::lock_guard<std::mutex> lock(lifeMutex_);
   if (started_) {
     return 1;
   }
@@ -119,6 +120,7 @@ int Protocol_LOKA::Start() {
 }
 
 int Protocol_LOKA::Stop() {
+  const std::lock_guard<std::mutex> lock(lifeMutex_);
   if (started_) {
     taskRunner_.Stop();
     link_.CloseWithoutSemaphore();
