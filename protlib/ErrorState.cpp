@@ -3,19 +3,37 @@
 
 #include <exception>
 
+namespace {
+
+constexpr const char* kOutOfMemory = "Out of memory";  // short enough for a string without memory
+
+}  // namespace
+
 void ErrorState::Set(int code, const char* text) {
   const LeafLock lock(mutex_);
-  const std::size_t next = (current_ + 1) % kKeptTexts;
   try {
-    texts_[next] = text;
+    text_ = text;
   } catch (const std::exception&) {
-    texts_[next] = "Out of memory";  // short enough to need no memory
+    text_ = kOutOfMemory;
   }
-  current_ = next;
   code_ = code;
 }
 
-const char* ErrorState::Text() const {
+const char* ErrorState::HandOutText() {
   const LeafLock lock(mutex_);
-  return texts_[current_].c_str();
+  if (handedOut_[lastHandedOut_] != text_) {
+    const std::size_t next = (lastHandedOut_ + 1) % kHandedOutTexts;
+    try {
+      handedOut_[next] = text_;
+    } catch (const std::exception&) {
+      return kOutOfMemory;
+    }
+    lastHandedOut_ = next;
+  }
+  return handedOut_[lastHandedOut_].c_str();
+}
+
+std::string ErrorState::Text() const {
+  const LeafLock lock(mutex_);
+  return text_;
 }

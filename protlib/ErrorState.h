@@ -22,15 +22,20 @@ class ErrorState {
 
   int Code() const { return code_; }
 
-  // The text handed out stays readable until kKeptTexts further errors have been recorded, so that
-  // a host thread can read it while another thread fails.
-  const char* Text() const;
+  // A text that the caller may read in place. It stays readable until kHandedOutTexts other texts
+  // have been handed out, so that a host thread can read it while other threads fail. Without
+  // memory it says "Out of memory".
+  const char* HandOutText();
+
+  // A copy of the text. Throws std::bad_alloc.
+  std::string Text() const;
 
  private:
-  static constexpr std::size_t kKeptTexts = 16;
+  static constexpr std::size_t kHandedOutTexts = 16;
 
   std::atomic<int> code_{kNoErrorYet};
   mutable LeafMutex mutex_;
-  std::array<std::string, kKeptTexts> texts_ LOKA_GUARDED_BY(mutex_);
-  std::size_t current_ LOKA_GUARDED_BY(mutex_) = 0;
+  std::string text_ LOKA_GUARDED_BY(mutex_);
+  std::array<std::string, kHandedOutTexts> handedOut_ LOKA_GUARDED_BY(mutex_);
+  std::size_t lastHandedOut_ LOKA_GUARDED_BY(mutex_) = 0;
 };

@@ -43,7 +43,7 @@ void ProtocolBase::SetMemoryError() const { SetError(kGeneralError, "Out of memo
 
 int ProtocolBase::GetLastError() const { return error_.Code(); }
 
-const char* ProtocolBase::GetLastErrorString() const { return error_.Text(); }
+const char* ProtocolBase::GetLastErrorString() const { return error_.HandOutText(); }
 
 const char* ProtocolBase::GetIdent() const { return ident_.empty() ? GetName() : ident_.c_str(); }
 

@@ -144,7 +144,7 @@ bool ProtocolBase::RunCommand(const ConsoleCommand& command) {
     return command.Answer(document == nullptr ? "" : document, true);
   }
   if (name == "lasterror") {
-    return command.Answer(GetLastErrorString(), true);
+    return command.Answer(error_.Text(), true);
   }
   if (name == "read") {
     CommandRead(command);
@@ -199,7 +199,7 @@ void ProtocolBase::CommandRead(const ConsoleCommand& command) {
   }
   const CommandTag tag(*this, command.Argument());
   if (tag.Get() == nullptr) {
-    command.Answer(GetLastErrorString(), true);
+    command.Answer(error_.Text(), true);
     return;
   }
   WorkBuffer<kStackBytes> value(tag.Get()->GetVarLength());
@@ -207,7 +207,7 @@ void ProtocolBase::CommandRead(const ConsoleCommand& command) {
     SetMemoryError();
   }
   if (!value.IsValid() || Read(tag.Get(), value.Data()) == 0) {
-    command.Answer(GetLastErrorString(), true);
+    command.Answer(error_.Text(), true);
     return;
   }
   ReplyHex(command, value.Data(), tag.Get()->GetVarLength());
@@ -221,7 +221,7 @@ void ProtocolBase::CommandWrite(const ConsoleCommand& command) {
   }
   const CommandTag tag(*this, command.Argument());
   if (tag.Get() == nullptr) {
-    command.Answer(GetLastErrorString(), true);
+    command.Answer(error_.Text(), true);
     return;
   }
   const std::string& hexData = command.Word(2);
@@ -239,5 +239,5 @@ void ProtocolBase::CommandWrite(const ConsoleCommand& command) {
     SetMemoryError();
   }
   const bool isWritten = value.IsValid() && Write(tag.Get(), value.Data()) != 0;
-  command.Answer(isWritten ? ConsoleTexts::kWritten : GetLastErrorString(), true);
+  command.Answer(isWritten ? std::string(ConsoleTexts::kWritten) : error_.Text(), true);
 }

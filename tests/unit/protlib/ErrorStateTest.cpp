@@ -11,7 +11,7 @@
 TEST(ErrorStateTest, StartsWithOneAndNoText) {
   const ErrorState error;
   EXPECT_EQ(error.Code(), 1);
-  EXPECT_STREQ(error.Text(), "");
+  EXPECT_STREQ(error.HandOutText(), "");
 }
 
 TEST(ErrorStateTest, OnlyTheLastErrorRemains) {
@@ -19,7 +19,7 @@ TEST(ErrorStateTest, OnlyTheLastErrorRemains) {
   error.Set(-1, "first");
   error.Set(-9, "second");
   EXPECT_EQ(error.Code(), -9);
-  EXPECT_STREQ(error.Text(), "second");
+  EXPECT_STREQ(error.HandOutText(), "second");
 }
 
 TEST(ErrorStateTest, CopiesTheText) {
@@ -27,25 +27,57 @@ TEST(ErrorStateTest, CopiesTheText) {
   std::string text = "a text that is longer than any small-string buffer";
   error.Set(-1, text.c_str());
   text.assign(text.size(), 'x');
-  EXPECT_STREQ(error.Text(), "a text that is longer than any small-string buffer");
+  EXPECT_STREQ(error.HandOutText(), "a text that is longer than any small-string buffer");
 }
 
 TEST(ErrorStateTest, CanRepeatItsOwnText) {
   ErrorState error;
   error.Set(-1, "text");
-  error.Set(-3, error.Text());
-  EXPECT_STREQ(error.Text(), "text");
+  error.Set(-3, error.HandOutText());
+  EXPECT_STREQ(error.HandOutText(), "text");
 }
 
-TEST(ErrorStateTest, TextStaysReadableThroughFifteenFurtherErrors) {
+TEST(ErrorStateTest, AHandedOutTextOutlivesAnyNumberOfErrors) {
   ErrorState error;
   const std::string text = "the text that a host thread is still reading";
   error.Set(-1, text.c_str());
-  const char* const held = error.Text();
+  const char* const held = error.HandOutText();
+  for (int i = 0; i < 1000; ++i) {
+    error.Set(
+        -3, ("another text, also too long for a small-string buffer " + std::to_string(i)).c_str());
+  }
+  EXPECT_EQ(held, text);
+}
+
+TEST(ErrorStateTest, AHandedOutTextOutlivesFifteenOthers) {
+  ErrorState error;
+  const std::string text = "the text that a host thread is still reading";
+  error.Set(-1, text.c_str());
+  const char* const held = error.HandOutText();
   for (int i = 0; i < 15; ++i) {
-    error.Set(-3, "another text, also too long for a small-string buffer");
+    const std::string other =
+        "another text, also too long for a small-string buffer " + std::to_string(i);
+    error.Set(-3, other.c_str());
+    EXPECT_EQ(error.HandOutText(), other);
     EXPECT_EQ(held, text) << i;
   }
+}
+
+TEST(ErrorStateTest, HandsOutOneTextWhileNothingChanges) {
+  ErrorState error;
+  error.Set(-1, "text");
+  EXPECT_EQ(error.HandOutText(), error.HandOutText());
+}
+
+TEST(ErrorStateTest, WithoutMemoryToHandATextOutItSaysSo) {
+  ErrorState error;
+  const std::string longText(200, 'x');
+  error.Set(-9, longText.c_str());
+  {
+    const FailingNew noMemory(1);
+    EXPECT_STREQ(error.HandOutText(), "Out of memory");
+  }
+  EXPECT_EQ(error.HandOutText(), longText);
 }
 
 TEST(ErrorStateTest, WithoutMemoryForTheTextItSaysSo) {
@@ -56,7 +88,7 @@ TEST(ErrorStateTest, WithoutMemoryForTheTextItSaysSo) {
     error.Set(-9, longText.c_str());
   }
   EXPECT_EQ(error.Code(), -9);
-  EXPECT_STREQ(error.Text(), "Out of memory");
+  EXPECT_STREQ(error.HandOutText(), "Out of memory");
 }
 
 TEST(ErrorStateTest, TextsOfManyThreadsStayWhole) {
