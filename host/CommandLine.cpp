@@ -90,7 +90,7 @@ int RunCommandLine(int argumentCount, const char* const* arguments) {
     CLI::App app("Runs the serial token driver on ports of this machine.", "loka");
     app.set_version_flag("--version", kVersion);
     app.footer(kExitText);
-    app.require_subcommand(1);
+    app.require_subcommand(0, 1);
     Arguments values;
     AddWatch(&app, &values);
     AddDemo(&app, &values);
@@ -98,6 +98,10 @@ int RunCommandLine(int argumentCount, const char* const* arguments) {
       app.parse(argumentCount, arguments);
     } catch (const CLI::ParseError& error) {
       return static_cast<int>(app.exit(error) == 0 ? ExitStatus::kDone : ExitStatus::kUsage);
+    }
+    if (app.get_subcommands().empty()) {
+      (void)std::fprintf(stderr, "%s", app.help().c_str());
+      return static_cast<int>(ExitStatus::kUsage);
     }
     return Dispatch(app, values);
   } catch (const std::exception& error) {

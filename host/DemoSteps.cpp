@@ -62,7 +62,7 @@ void DemoSteps::StartHost(const std::string& configuration, bool withStore) {
 }
 
 void DemoSteps::DeviceSends(const std::string& bytes) {
-  report_->Show("device sends", HexBytes(bytes));
+  report_->Show("device sends", HexBytes(bytes) + "   " + Quoted(bytes));
   if (!device_->Send(bytes)) {
     report_->Fail("the simulated device does not send");
   }

@@ -5,10 +5,14 @@
 #include <sys/sysmacros.h>
 #include <unistd.h>
 
+#include <algorithm>
 #include <cstdlib>
 #include <filesystem>
 #include <fstream>
+#include <iterator>
 #include <sstream>
+
+#include "host/ByteText.h"
 
 namespace fs = std::filesystem;
 
@@ -27,11 +31,24 @@ void ForEachProcess(Visitor visit) {
   }
 }
 
+// The command line with its arguments, shortened; the kernel's short name where there is none.
 std::string CommandOf(int processId) {
-  std::ifstream file("/proc/" + std::to_string(processId) + "/comm");
-  std::string command;
-  std::getline(file, command);
-  return command.empty() ? "?" : command;
+  constexpr std::size_t kMostCharacters = 60;
+  const std::string folder = "/proc/" + std::to_string(processId);
+  std::ifstream lineFile(folder + "/cmdline", std::ios::binary);
+  std::string command{std::istreambuf_iterator<char>(lineFile), std::istreambuf_iterator<char>()};
+  while (!command.empty() && command.back() == '\0') {
+    command.pop_back();
+  }
+  std::replace(command.begin(), command.end(), '\0', ' ');
+  if (command.empty()) {
+    std::ifstream nameFile(folder + "/comm");
+    std::getline(nameFile, command);
+  }
+  if (command.size() > kMostCharacters) {
+    command = command.substr(0, kMostCharacters) + "...";
+  }
+  return command.empty() ? "?" : EscapeBytes(command);
 }
 
 // Two nodes name the same device. Numbers of pseudo-terminals count within their own mount only.

@@ -7,7 +7,7 @@
 // A process that has a device open.
 struct PortHolder {
   int processId = 0;
-  std::string command;  // the kernel's short name of the process, at most 15 characters
+  std::string command;  // its command line, escaped and cut after 60 characters
 };
 
 // Who holds the device behind `path`: the owner of the file lock on it (/proc/locks) where there is

@@ -29,12 +29,7 @@ void SetProblem(PortProblem* problem, PortProblem::Kind kind, const std::string&
 
 void SetBusy(PortProblem* problem) {
   problem->holders = FindPortHolders(problem->path);
-  std::string text = "in use";
-  if (!problem->holders.empty()) {
-    const PortHolder& first = problem->holders.front();
-    text += " by process " + std::to_string(first.processId) + " (" + first.command + ")";
-  }
-  SetProblem(problem, PortProblem::Kind::kBusy, text);
+  SetProblem(problem, PortProblem::Kind::kBusy, "in use");
 }
 
 void SetOpenProblem(int errorNumber, PortProblem* problem) {

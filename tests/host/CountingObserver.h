@@ -1,0 +1,63 @@
+// SPDX-License-Identifier: Apache-2.0
+#pragma once
+
+#include <condition_variable>
+#include <mutex>
+#include <string>
+#include <vector>
+
+#include "host/Deadline.h"
+#include "host/PortObserver.h"
+
+// Remembers what a port tells and lets a test wait for it.
+class CountingObserver final : public PortObserver {
+ public:
+  void OnReceivePause(const ReceiveProgress& progress) override {
+    const std::lock_guard<std::mutex> lock(mutex_);
+    progress_ = progress;
+    ++pauses_;
+    changed_.notify_all();
+  }
+  void OnLineLost(const std::string& path, const std::string& why) override {
+    OnPortNote("lost " + path + ": " + why);
+  }
+  void OnLineBack(const std::string& path) override { OnPortNote("back " + path); }
+  void OnPortNote(const std::string& text) override {
+    const std::lock_guard<std::mutex> lock(mutex_);
+    notes_.push_back(text);
+    changed_.notify_all();
+  }
+
+  int Pauses() const {
+    const std::lock_guard<std::mutex> lock(mutex_);
+    return pauses_;
+  }
+  ReceiveProgress Progress() const {
+    const std::lock_guard<std::mutex> lock(mutex_);
+    return progress_;
+  }
+  std::vector<std::string> Notes() const {
+    const std::lock_guard<std::mutex> lock(mutex_);
+    return notes_;
+  }
+  // Waits until a further pause begins.
+  bool AwaitPause(int limitMs) {
+    std::unique_lock<std::mutex> lock(mutex_);
+    const int before = pauses_;
+    return changed_.wait_for(lock, Deadline::After(limitMs).Remaining(),
+                             [&] { return pauses_ > before; });
+  }
+  // Waits until the driver has worked off so many bytes.
+  bool AwaitBytes(std::uint64_t count, int limitMs) {
+    std::unique_lock<std::mutex> lock(mutex_);
+    return changed_.wait_for(lock, Deadline::After(limitMs).Remaining(),
+                             [&] { return progress_.receivedBytes >= count; });
+  }
+
+ private:
+  mutable std::mutex mutex_;
+  std::condition_variable changed_;
+  int pauses_ = 0;
+  ReceiveProgress progress_;
+  std::vector<std::string> notes_;
+};

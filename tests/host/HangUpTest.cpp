@@ -1,0 +1,166 @@
+// SPDX-License-Identifier: Apache-2.0
+#include <gtest/gtest.h>
+#include <unistd.h>
+
+#include <chrono>
+#include <fstream>
+#include <memory>
+#include <sstream>
+
+#include "host/PosixSerialPort.h"
+#include "host/PseudoTerminal.h"
+#include "tests/host/CountingObserver.h"
+#include "tests/host/LockingProcess.h"
+#include "tests/host/PluginConfiguration.h"
+#include "tests/host/ProgramRun.h"
+#include "tests/host/TemporaryFolder.h"
+
+namespace fs = std::filesystem;
+
+namespace {
+
+constexpr int kLimitMs = 20000;
+
+// A line under a name that stays when another pseudo-terminal takes its place.
+class ReplaceableLine {
+ public:
+  ReplaceableLine() { Connect(); }
+  void Connect() {
+    line_ = std::make_unique<PseudoTerminal>();
+    fs::create_symlink(line_->Path(), Path());
+  }
+  void Disconnect() {
+    fs::remove(Path());
+    line_.reset();
+  }
+  std::string Path() const { return folder_.File("line"); }
+  PseudoTerminal* operator->() const { return line_.get(); }
+
+ private:
+  TemporaryFolder folder_;
+  std::unique_ptr<PseudoTerminal> line_;
+};
+
+std::unique_ptr<PosixSerialPort> OpenPort(const std::string& path, PortObserver* observer) {
+  PortProblem problem;
+  std::shared_ptr<SerialDevice> device = SerialDevice::Open(path, &problem);
+  EXPECT_NE(device, nullptr) << problem.text;
+  return std::make_unique<PosixSerialPort>(device, path, observer);
+}
+
+// Processor time of a process in milliseconds.
+long ProcessorMs(int processId) {
+  std::ifstream file("/proc/" + std::to_string(processId) + "/stat");
+  std::string line;
+  std::getline(file, line);
+  std::istringstream fields(line.substr(line.rfind(')') + 1));
+  std::string skipped;
+  for (int field = 3; field < 14; ++field) {
+    fields >> skipped;
+  }
+  long user = 0;
+  long system = 0;
+  fields >> user >> system;
+  return (user + system) * 1000 / sysconf(_SC_CLK_TCK);
+}
+
+TEST(HangUp, ReceiveWaitsItsTimeOutsOut) {
+  auto line = std::make_unique<PseudoTerminal>();
+  const auto port = OpenPort(line->Path(), nullptr);
+  line.reset();
+  // Not early is what counts; late is the machine's business.
+  for (int round = 0; round < 3; ++round) {
+    const auto begin = std::chrono::steady_clock::now();
+    unsigned char byte = 0;
+    EXPECT_EQ(port->Receive(&byte, 30, 0), 0);
+    EXPECT_GE(std::chrono::steady_clock::now() - begin, std::chrono::milliseconds(30));
+  }
+}
+
+TEST(HangUp, LineThatComesBackIsOpenedAgainWithItsSettings) {
+  CountingObserver observer;
+  ReplaceableLine line;
+  const auto port = OpenPort(line.Path(), &observer);
+  ASSERT_EQ(port->Setup(9600, 1, 8, 1, 0), 1);
+  line.Disconnect();
+  unsigned char byte = 0;
+  ASSERT_EQ(port->Receive(&byte, 1, 0), 0);
+  // Set while the line is away, in effect once it is back.
+  EXPECT_EQ(port->Setup(19200, 0, 8, 1, 0), 0);
+  line.Connect();
+  ASSERT_TRUE(line->Send("z", Deadline::After(kLimitMs)));
+  ASSERT_EQ(port->Receive(&byte, kLimitMs, 0), 1);
+  EXPECT_EQ(byte, 'z');
+  ASSERT_EQ(observer.Notes().size(), 2U);
+  EXPECT_EQ(observer.Notes()[1], "back " + line.Path());
+  EXPECT_EQ(port->Send(&byte, 1, 0), 1);
+  std::string seen;
+  EXPECT_TRUE(line->Receive(1, Deadline::After(kLimitMs), &seen));
+  EXPECT_EQ(seen, "z");
+}
+
+TEST(HangUp, SomebodysTerminalIsNotTakenForTheLine) {
+  ReplaceableLine line;
+  CountingObserver observer;
+  const auto port = OpenPort(line.Path(), &observer);
+  line.Disconnect();
+  unsigned char byte = 0;
+  ASSERT_EQ(port->Receive(&byte, 1, 0), 0);
+  line.Connect();
+  {
+    const SessionProcess login(line.Path());
+    ASSERT_TRUE(line->Send("typed by somebody", Deadline::After(kLimitMs)));
+    // Three times the interval at which the port looks for its line.
+    EXPECT_EQ(port->Receive(&byte, 1500, 0), 0);
+    EXPECT_EQ(observer.Notes().size(), 1U);
+  }
+}
+
+// Two seconds of measuring; 2 % of them are 40 ms.
+TEST(HangUp, WatchDoesNotSpinAndGoesOnWhenTheLineIsBack) {
+  constexpr int kMeasureMs = 2000;
+  constexpr long kMostMs = kMeasureMs * 2 / 100;
+  ReplaceableLine line;
+  ProgramRun watch({"watch", "--no-store", "--port", line.Path(), "--config",
+                    TestConfiguration("rx_prefix=02 rx_suffix=03 gap=20")});
+  ASSERT_TRUE(watch.AwaitErrors("queue 100")) << watch.Errors();
+  ASSERT_TRUE(
+      line->Send("\x02"
+                 "one\x03",
+                 Deadline::After(kLimitMs)));
+  EXPECT_NE(watch.Line().find("\"one\""), std::string::npos);
+
+  line.Disconnect();
+  ASSERT_TRUE(watch.AwaitErrors(line.Path() + ": line lost")) << watch.Errors();
+  const long before = ProcessorMs(watch.ProcessId());
+  Deadline::After(kMeasureMs).Sleep();
+  const long used = ProcessorMs(watch.ProcessId()) - before;
+  RecordProperty("processor_ms_while_lost", static_cast<int>(used));
+  EXPECT_LT(used, kMostMs);
+
+  line.Connect();
+  ASSERT_TRUE(watch.AwaitErrors(line.Path() + ": line is back")) << watch.Errors();
+  ASSERT_TRUE(
+      line->Send("\x02"
+                 "two\x03",
+                 Deadline::After(kLimitMs)));
+  EXPECT_NE(watch.Line().find("\"two\""), std::string::npos);
+  line.Disconnect();
+  ASSERT_TRUE(watch.AwaitErrors(line.Path() + ": line lost")) << watch.Errors();
+  watch.Signal(SIGINT);
+  EXPECT_EQ(watch.Status(), 128 + SIGINT);
+}
+
+TEST(HangUp, IdleWatchUsesHardlyAnyProcessorTime) {
+  constexpr int kMeasureMs = 2000;
+  constexpr long kMostMs = kMeasureMs * 2 / 100;
+  const PseudoTerminal line;
+  ProgramRun watch({"watch", "--no-store", "--port", line.Path(), "--config",
+                    TestConfiguration("rx_prefix=02 rx_suffix=03")});
+  ASSERT_TRUE(watch.AwaitErrors("queue 100")) << watch.Errors();
+  const long before = ProcessorMs(watch.ProcessId());
+  Deadline::After(kMeasureMs).Sleep();
+  EXPECT_LT(ProcessorMs(watch.ProcessId()) - before, kMostMs);
+}
+
+}  // namespace
