@@ -9,7 +9,7 @@
 #include "tests/unit/FailingNew.h"
 
 TEST(ErrorStateTest, StartsWithOneAndNoText) {
-  const ErrorState error;
+  ErrorState error;
   EXPECT_EQ(error.Code(), 1);
   EXPECT_STREQ(error.HandOutText(), "");
 }
