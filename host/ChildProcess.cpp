@@ -112,6 +112,12 @@ void ChildProcess::CloseInput() {
   }
 }
 
+void ChildProcess::Signal(int signalNumber) const {
+  if (!isOver_) {
+    (void)kill(processId_, signalNumber);
+  }
+}
+
 bool ChildProcess::WriteLine(const std::string& line) const {
   const std::string text = line + "\n";
   std::size_t sent = 0;

@@ -22,6 +22,9 @@ class ChildProcess {
 
   int ProcessId() const { return processId_; }
 
+  // Sends it a signal (kill(2)) unless its end was already seen.
+  void Signal(int signalNumber) const;
+
   // False when the process no longer listens.
   bool WriteLine(const std::string& line) const;
 

@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "host/HostSession.h"
 
-#include <exception>
+#include <atomic>
 #include <utility>
 
 #include "interfaces/IProtModule.h"
@@ -12,6 +12,9 @@ namespace {
 
 constexpr const char* kProtocolName = "LOKA";
 constexpr int kEndTasksLimitMs = 2000;
+
+// Set while a session of this process is open.
+std::atomic<bool> isSessionOpen{false};
 
 HostResult Failure(ExitStatus status, std::string text) {
   HostResult result;
@@ -39,7 +42,15 @@ HostSession::HostSession(HostOptions options)
 
 HostSession::~HostSession() { Close(); }
 
+bool HostSession::TakeTurn() {
+  hasTurn_ = hasTurn_ || !isSessionOpen.exchange(true);
+  return hasTurn_;
+}
+
 HostResult HostSession::Open() {
+  if (!TakeTurn()) {
+    return Failure(ExitStatus::kPlugin, "another session of this process is open");
+  }
   HostResult result = OpenStorage();
   if (!result.IsDone()) {
     return result;
@@ -148,4 +159,8 @@ void HostSession::Close() {
     module_ = nullptr;
   }
   plugin_.reset();
+  if (hasTurn_) {
+    hasTurn_ = false;
+    isSessionOpen.store(false);
+  }
 }

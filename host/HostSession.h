@@ -38,7 +38,8 @@ struct HostResult {
 };
 
 // The whole host around one protocol instance, from loading the plug-in to unloading it, taken down
-// in the opposite order. Called on one thread; tags may be used on others.
+// in the opposite order. Called on one thread; tags may be used on others. One session a process is
+// open at a time: a plug-in's module keeps the services of the first host that binds it.
 class HostSession {
  public:
   explicit HostSession(HostOptions options);
@@ -75,11 +76,13 @@ class HostSession {
   PortProblem LastPortProblem() const { return serialFactory_.LastProblem(); }
 
  private:
+  bool TakeTurn();
   HostResult OpenStorage();
   HostResult BindModule();
   void Close();
 
   HostOptions options_;
+  bool hasTurn_ = false;
   PosixMultiTask multiTask_;
   PosixSerialFactory serialFactory_;
   std::unique_ptr<SqliteStorage> storage_;

@@ -5,6 +5,7 @@
 #include <sys/file.h>
 #include <sys/ioctl.h>
 #include <sys/stat.h>
+#include <sys/sysmacros.h>
 #include <termios.h>
 #include <unistd.h>
 
@@ -71,6 +72,22 @@ bool IsCharacterDevice(const std::string& path, PortProblem* problem) {
   return true;
 }
 
+bool IsPseudoTerminal(int fileDescriptor) {
+  // Major numbers 136 to 143 (the kernel's devices.txt).
+  constexpr unsigned int kFirstMajor = 136;
+  constexpr unsigned int kLastMajor = 143;
+  struct stat status {};
+  return fstat(fileDescriptor, &status) == 0 && major(status.st_rdev) >= kFirstMajor &&
+         major(status.st_rdev) <= kLastMajor;
+}
+
+// tcsetattr(3), made to succeed where a pseudo-terminal can have neither 7 bits nor parity: the C
+// library answers EINVAL there when nothing else was to be changed.
+bool SetLine(int fileDescriptor, const termios& line) {
+  return tcsetattr(fileDescriptor, TCSANOW, &line) == 0 ||
+         (errno == EINVAL && IsPseudoTerminal(fileDescriptor));
+}
+
 bool MakeExclusive(int fileDescriptor) {
   if (flock(fileDescriptor, LOCK_EX | LOCK_NB) != 0) {
     return false;
@@ -86,7 +103,7 @@ bool MakeRaw(int fileDescriptor) {
     return false;
   }
   BuildRawMode(&line);
-  return tcsetattr(fileDescriptor, TCSANOW, &line) == 0;
+  return SetLine(fileDescriptor, line);
 }
 
 }  // namespace
@@ -136,7 +153,7 @@ bool SerialDevice::Apply(const LineSettings& settings, std::string* why, std::st
   }
   termios line{};
   if (tcgetattr(fileDescriptor_, &line) != 0 || !BuildTermios(settings, &line) ||
-      tcsetattr(fileDescriptor_, TCSANOW, &line) != 0) {
+      !SetLine(fileDescriptor_, line)) {
     *why = "the device refuses " + DescribeLine(settings) + ": " + ErrorText(errno);
     return false;
   }

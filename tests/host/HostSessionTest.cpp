@@ -38,16 +38,37 @@ TEST_F(HostSessionTest, GoesThroughALifeAndLeavesNothingOpen) {
   EXPECT_EQ(session.PluginPath(), PluginLibrary::DefaultPath());
   ASSERT_TRUE(session.Configure(TestConfiguration("rx_suffix=03 gap=20")).IsDone());
   ASSERT_TRUE(session.Start().IsDone());
-  // The port is held while the session runs, and free afterwards.
-  HostSession second(Options());
-  ASSERT_TRUE(second.Open().IsDone());
-  ASSERT_TRUE(second.Configure(TestConfiguration("rx_suffix=03 gap=20")).IsDone());
-  const HostResult busy = second.Start();
+  PosixSerialFactory other(Options().ports, nullptr);
+  EXPECT_EQ(other.OpenPort("com1"), nullptr);
+  session.Stop();
+  EXPECT_NE(other.OpenPort("com1"), nullptr);
+}
+
+TEST_F(HostSessionTest, StartsAgainAfterAStopUnlessThePortIsTaken) {
+  HostSession session(Options());
+  ASSERT_TRUE(session.Open().IsDone());
+  ASSERT_TRUE(session.Configure(TestConfiguration("rx_suffix=03 gap=20")).IsDone());
+  ASSERT_TRUE(session.Start().IsDone());
+  session.Stop();
+  PosixSerialFactory other(Options().ports, nullptr);
+  ISerialPort* const port = other.OpenPort("com1");
+  ASSERT_NE(port, nullptr);
+  const HostResult busy = session.Start();
   EXPECT_EQ(busy.status, ExitStatus::kPort);
   EXPECT_EQ(busy.text, "Can't open serial port");
   EXPECT_EQ(busy.problem.kind, PortProblem::Kind::kBusy);
-  session.Stop();
-  EXPECT_TRUE(second.Start().IsDone());
+  other.ReleasePort(port);
+  EXPECT_TRUE(session.Start().IsDone());
+}
+
+TEST_F(HostSessionTest, OneSessionAtATime) {
+  HostSession second(Options());
+  {
+    HostSession first(Options());
+    ASSERT_TRUE(first.Open().IsDone());
+    EXPECT_EQ(second.Open().text, "another session of this process is open");
+  }
+  EXPECT_TRUE(second.Open().IsDone());
 }
 
 TEST_F(HostSessionTest, SaysWhatTheDriverSaysAboutAConfiguration) {
@@ -129,7 +150,8 @@ TEST_F(HostSessionTest, OverridesAreStoredAndWinAfterARestart) {
   HostSession session(options);
   ASSERT_TRUE(session.Open().IsDone());
   ASSERT_TRUE(session.Configure(TestConfiguration("rx_suffix=03 gap=20")).IsDone());
-  ASSERT_TRUE(session.Start().IsDone());
+  const HostResult result = session.Start();
+  ASSERT_TRUE(result.IsDone()) << result.text << " " << result.problem.text;
   std::string error;
   const auto suffix = session.CreateTag("0?SP_RxSuffix?string-16", &error);
   std::string text;

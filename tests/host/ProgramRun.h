@@ -29,6 +29,10 @@ class ProgramRun {
     process_ = std::make_unique<ChildProcess>("/bin/sh", all);
   }
 
+  ~ProgramRun() { Signal(SIGTERM); }
+  ProgramRun(const ProgramRun&) = delete;
+  ProgramRun& operator=(const ProgramRun&) = delete;
+
   int ProcessId() const { return process_->ProcessId(); }
   std::string StoreFile() const { return folder_.File("loka/store.db"); }
 
@@ -64,7 +68,7 @@ class ProgramRun {
     return true;
   }
 
-  void Signal(int signalNumber) const { kill(ProcessId(), signalNumber); }
+  void Signal(int signalNumber) const { process_->Signal(signalNumber); }
 
   // The exit status once the program has ended.
   int Status() { return process_->Wait(Deadline::After(kLimitMs)); }

@@ -87,7 +87,7 @@ TEST(Program, WatchPrintsEachTokenAndAcknowledgesIt) {
   ASSERT_TRUE(watch.AwaitErrors("queue 100")) << watch.Errors();
   EXPECT_TRUE(Holds(watch.Errors(), "com1 = " + line.Path() + "  115200 8N1 RS-232"));
   EXPECT_TRUE(Holds(watch.Errors(), "rx 02 ... 03  tx none ... none  gap 50 ms  hex tokens off"));
-  const std::string second = std::string("\x02\x1B[31m\xFF\"\x03", 8);
+  const std::string second = std::string("\x02\x1B[31m\xFF\"\x03", 9);
   ASSERT_TRUE(
       line.Send("\x02"
                 "ABC\x03" +
