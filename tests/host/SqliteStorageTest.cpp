@@ -212,10 +212,9 @@ TEST_F(SqliteStorageTest, LeavesAFileThatIsNoDatabaseAlone) {
 TEST_F(SqliteStorageTest, LeavesADamagedStoreAlone) {
   {
     const auto storage = Open();
-    for (int i = 0; i < 2000; ++i) {
-      const StorageBatch batch(storage.get());
+    const StorageBatch batch(storage.get());
+    for (int i = 0; i < 1000; ++i) {
       storage->SetString("ident", ("key" + std::to_string(i)).c_str(), "some value of a length");
-      i += 1;
     }
   }
   std::string bytes = Contents(path_);
@@ -276,19 +275,6 @@ TEST_F(SqliteStorageTest, FailedBatchKeepsItsValuesInMemoryAndSaysSo) {
   storage->SetInteger("a", "k", 2);
   EXPECT_EQ(Open()->GetInteger("a", "k"), 2);
   EXPECT_EQ(failures_.size(), 1U);
-}
-
-TEST_F(SqliteStorageTest, SetOutsideABatchReportsItsFailure) {
-  const auto storage = Open();
-  // Another connection holds the file for writing; the wait for it ends after two seconds.
-  sqlite3* other = nullptr;
-  ASSERT_EQ(sqlite3_open(path_.c_str(), &other), SQLITE_OK);
-  ASSERT_EQ(sqlite3_exec(other, "BEGIN IMMEDIATE", nullptr, nullptr, nullptr), SQLITE_OK);
-  storage->SetInteger("a", "k", 3);
-  sqlite3_close(other);
-  ASSERT_EQ(failures_.size(), 1U);
-  EXPECT_NE(failures_[0].find("is locked by another process"), std::string::npos) << failures_[0];
-  EXPECT_EQ(storage->GetInteger("a", "k"), 3);
 }
 
 TEST_F(SqliteStorageTest, ThreadsSetTheSameKeysWithoutLosingTheLast) {
