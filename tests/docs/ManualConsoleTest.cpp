@@ -100,15 +100,35 @@ TEST_F(ManualConsoleTest, EachReplyHasTheResultSaid) {
     seen.emplace(reply, result ? "true" : "false");
   };
   DriverInUse use;
-  ASSERT_TRUE(use.Start("CfgVer=1 model=1 port=com1 baudrate=9600 parity=even bits=8 stopbits=1 "
-                        "mode=RS-232"));
-  for (const char* line : {"get_stat", "put A", "connect", "connect x", "put", "set_rxGap",
-                           "set_rxGap x", "set_hexToken", "set_hexToken x", "set_rxPrefix",
-                           "set_rxSuffix", "set_txPrefix", "set_txSuffix", "getmaxtm", "read",
-                           "read a b", "write", "write a b c", "write 0?SP_Gap?unsignedInt 00",
+  ASSERT_TRUE(
+      use.Start("CfgVer=1 model=1 port=com1 baudrate=9600 parity=even bits=8 stopbits=1 "
+                "mode=RS-232"));
+  for (const char* line : {"get_stat",
+                           "put A",
+                           "connect",
+                           "connect x",
+                           "put",
+                           "set_rxGap",
+                           "set_rxGap x",
+                           "set_hexToken",
+                           "set_hexToken x",
+                           "set_rxPrefix",
+                           "set_rxSuffix",
+                           "set_txPrefix",
+                           "set_txSuffix",
+                           "getmaxtm",
+                           "read",
+                           "read a b",
+                           "write",
+                           "write a b c",
+                           "write 0?SP_Gap?unsignedInt 00",
                            "write 0?SP_Gap?unsignedInt 0000000x",
-                           "write 0?SP_Gap?unsignedInt 00000000", "set_hexToken ON", "put A",
-                           "connect OFF", "put 41", "get_stat"}) {
+                           "write 0?SP_Gap?unsignedInt 00000000",
+                           "set_hexToken ON",
+                           "put A",
+                           "connect OFF",
+                           "put 41",
+                           "get_stat"}) {
     note(use, line);
   }
   use.Host().Faults().FailAlways("Setup");
@@ -125,10 +145,11 @@ TEST_F(ManualConsoleTest, TheSessionGoesAsWritten) {
   }
   DriverInUse use;
   ASSERT_TRUE(use.Start(first));
-  use.Receive("\x02"
-              "AB\x03\x02"
-              "CD\x03",
-              "com1");
+  use.Receive(
+      "\x02"
+      "AB\x03\x02"
+      "CD\x03",
+      "com1");
   for (const Row& row : manual_.Rows("Typed")) {
     bool result = false;
     const std::string reply = use.Command(TheSpan(row[0]), result);

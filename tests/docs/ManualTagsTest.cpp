@@ -197,14 +197,9 @@ TEST_F(ManualSettingsTest, EachSettingHasTheKeyAndTheStoredNameSaid) {
     int applied;
   };
   const std::map<std::string, Values> kValues = {
-      {"baudrate", {"300", 300, 600}},
-      {"parity", {"mark", 3, 1}},
-      {"bits", {"7", 7, 8}},
-      {"stopbits", {"2", 2, 1}},
-      {"mode", {"RS-422", 2, 1}},
-      {"gap", {"90", 90, 40}},
-      {"hex_tokens", {"true", 1, 0}},
-      {"token_queue_size", {"9", 9, 4}},
+      {"baudrate", {"300", 300, 600}}, {"parity", {"mark", 3, 1}},        {"bits", {"7", 7, 8}},
+      {"stopbits", {"2", 2, 1}},       {"mode", {"RS-422", 2, 1}},        {"gap", {"90", 90, 40}},
+      {"hex_tokens", {"true", 1, 0}},  {"token_queue_size", {"9", 9, 4}},
   };
   for (const Row& row : Settings()) {
     const MemoryTypeRow* memoryType = FindMemoryType(TheSpan(row[2]));

@@ -24,7 +24,9 @@ const char* const kGenericSources[] = {
     "protlib/TagBase.cpp",      "protlib/TagBase_Convert.cpp",     "protlib/CfgParserN.cpp",
     "factory/ProtModule.cpp"};
 
-bool HasBlank(const std::string& text) { return text.find(' ') != std::string::npos; }
+bool HasBlank(const std::string& text) {
+  return text.find(' ') != std::string::npos && text.find_first_not_of(" \t") != std::string::npos;
+}
 
 // Whether the text is one literal or several in a row.
 bool IsMadeOf(const std::string& text, const std::set<std::string>& literals) {
@@ -51,6 +53,16 @@ std::string WithoutVarying(const std::string& text) {
   std::string joined;
   for (const std::string& piece : Pieces(text)) joined += piece;
   return joined;
+}
+
+// The headers of texts hold constants only: every text has a name by which the tests find it.
+TEST(ManualSourcesTest, EveryTextInTheHeadersHasAName) {
+  for (const char* header :
+       {"driver/Texts_LOKA.h", "driver/ConsoleTexts_LOKA.h", "protlib/ConsoleTexts.h",
+        "driver/ConfigKeys.h", "driver/ParameterNames.h"}) {
+    EXPECT_EQ(ConstantsOf(header).size(), LiteralsOf(header).size()) << header;
+    EXPECT_GT(ConstantsOf(header).size(), 5U) << header;
+  }
 }
 
 class ManualTextsTest : public ::testing::Test {
@@ -88,9 +100,9 @@ TEST_F(ManualTextsTest, EveryTextOfTheDriverHasARow) {
 
 TEST_F(ManualTextsTest, EveryGenericTextIsInARow) {
   for (const std::string& text : generic_) {
-    EXPECT_TRUE(std::any_of(
-        codes_.begin(), codes_.end(),
-        [&](const auto& row) { return row.first.find(text) != std::string::npos; }))
+    EXPECT_TRUE(
+        std::any_of(codes_.begin(), codes_.end(),
+                    [&](const auto& row) { return row.first.find(text) != std::string::npos; }))
         << "\"" << text << "\"";
   }
 }
@@ -124,8 +136,8 @@ TEST_F(ManualTextsTest, TheCodesAreThoseRecorded) {
   EXPECT_GE(count, 15);
 }
 
-// Whatever else looks like a text (it holds a blank) stands in the manual, too: in a code span or an
-// example. So a text that is raised somewhere new does not go unnoticed.
+// Whatever else looks like a text (it holds a blank) stands in the manual, too: in a code span or
+// an example. So a text that is raised somewhere new does not go unnoticed.
 TEST_F(ManualTextsTest, NoTextOfTheSourcesIsMissing) {
   const MarkdownText manual("docs/manual.md");
   std::string said;

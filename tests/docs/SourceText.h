@@ -8,8 +8,8 @@
 // Source files of the driver as the tests of the manual read them: what C++ cannot enumerate at run
 // time stands in their string literals.
 
-// The string literals of a source file, adjacent ones joined, without those in comments and include
-// lines.
+// The string literals of a source file, adjacent ones joined, without those in comments, include
+// lines and compile-time checks.
 std::vector<std::string> LiteralsOf(const std::string& path);
 
 // The named string constants of a header, "kName" to its text.
