@@ -23,7 +23,7 @@ static_assert(sizeof(XmlBlock) == sizeof LOKA_XML_IDENTIFICATION + sizeof LOKA_X
               "the block has to be contiguous");
 
 const XmlBlock Xml_LOKA = {LOKA_XML_IDENTIFICATION, LOKA_XML_LENGTH_LINE, XML_STREAM_BYTES,
-                               LOKA_XML_END};
+                           LOKA_XML_END};
 
 }  // namespace
 
