@@ -3,6 +3,7 @@
 
 #include <cstddef>
 #include <cstdlib>
+#include <limits>
 #include <new>
 
 namespace {
@@ -22,8 +23,12 @@ bool IsToFail() {
   return true;
 }
 
+// No machine has it, and a sanitizer ends the program when it is asked for.
+constexpr std::size_t kTooMuchBytes = std::numeric_limits<std::size_t>::max() / 4;
+
 void* Allocate(std::size_t sizeBytes) noexcept {
-  return IsToFail() ? nullptr : std::malloc(sizeBytes == 0 ? 1 : sizeBytes);
+  return IsToFail() || sizeBytes > kTooMuchBytes ? nullptr
+                                                 : std::malloc(sizeBytes == 0 ? 1 : sizeBytes);
 }
 
 void* AllocateOrThrow(std::size_t sizeBytes) {
