@@ -16,8 +16,6 @@
 #include "host/Deadline.h"
 #include "host/ExitStatus.h"
 
-extern char** environ;
-
 namespace {
 
 constexpr int kEndLimitMs = 5000;
@@ -61,6 +59,7 @@ int Spawn(const std::string& file, const std::vector<std::string>& arguments,
 
   std::vector<char*> argv;
   std::vector<std::string> copies = arguments;
+  argv.reserve(copies.size() + 1);
   for (std::string& argument : copies) {
     argv.push_back(argument.data());
   }

@@ -109,7 +109,7 @@ class PosixSerialPort final : public ISerialPort {
 
   // Receiving thread only.
   std::shared_ptr<SerialDevice> receiveDevice_;
-  std::array<unsigned char, kBufferBytes> buffer_;
+  std::array<unsigned char, kBufferBytes> buffer_{};
   std::size_t next_ = 0;
   std::size_t end_ = 0;
   ReceiveProgress progress_;

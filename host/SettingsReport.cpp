@@ -114,12 +114,15 @@ std::string DescribeFraming(HostSession* session) {
       !ReadNumber(session, "SP_TokenQueueSize", "unsignedInt", &queueSize)) {
     return {};
   }
-  std::string gap = std::to_string(gapMs);
-  gap += gapMs == 0 ? " (" + std::to_string(kDefaultGapMs) + " ms)" : " ms";
-  return "rx " + ReadHexText(session, "SP_RxPrefix") + " ... " +
-         ReadHexText(session, "SP_RxSuffix") + "  tx " + ReadHexText(session, "SP_TxPrefix") +
-         " ... " + ReadHexText(session, "SP_TxSuffix") + "  gap " + gap + "  hex tokens " +
-         (hexTokens != 0 ? "on" : "off") + "  queue " + std::to_string(queueSize);
+  std::string text = "rx " + ReadHexText(session, "SP_RxPrefix");
+  text += " ... " + ReadHexText(session, "SP_RxSuffix");
+  text += "  tx " + ReadHexText(session, "SP_TxPrefix");
+  text += " ... " + ReadHexText(session, "SP_TxSuffix");
+  text += "  gap " + std::to_string(gapMs);
+  text += gapMs == 0 ? " (" + std::to_string(kDefaultGapMs) + " ms)" : " ms";
+  text += hexTokens != 0 ? "  hex tokens on" : "  hex tokens off";
+  text += "  queue " + std::to_string(queueSize);
+  return text;
 }
 
 }  // namespace

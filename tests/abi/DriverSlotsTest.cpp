@@ -22,8 +22,7 @@ class DriverSlotsTest : public ::testing::Test {
   void SetUp() override {
     PluginLibrary& library = PluginLibrary::Shared();
     ASSERT_NE(library.Factory(), nullptr) << library.Error();
-    using GetFactory = void* (*)();
-    factory_ = reinterpret_cast<GetFactory>(library.Symbol("GetInterfaceFactory"))();
+    factory_ = library.Factory();
     module_ = CallSlot<void*, Text>(factory_, 0, "IProtModule");
     protocols_ = CallSlot<void*, Text>(factory_, 0, "IProtocolFactory");
     ASSERT_NE(module_, nullptr);

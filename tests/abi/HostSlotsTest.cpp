@@ -222,8 +222,7 @@ class HostSlotsTest : public ::testing::Test {
 
     PluginLibrary& library = PluginLibrary::Shared();
     ASSERT_NE(library.Factory(), nullptr) << library.Error();
-    using GetFactory = void* (*)();
-    void* plugin = reinterpret_cast<GetFactory>(library.Symbol("GetInterfaceFactory"))();
+    void* plugin = library.Factory();
     module_ = CallSlot<void*, const char*>(plugin, 0, "IProtModule");
     protocols_ = CallSlot<void*, const char*>(plugin, 0, "IProtocolFactory");
   }
