@@ -24,8 +24,8 @@ void ForEachProcess(Visitor visit) {
   std::error_code error;
   for (fs::directory_iterator entry("/proc", error), end; !error && entry != end;
        entry.increment(error)) {
-    const int processId = static_cast<int>(
-        std::strtol(entry->path().filename().c_str(), nullptr, 10));
+    const int processId =
+        static_cast<int>(std::strtol(entry->path().filename().c_str(), nullptr, 10));
     if (processId > 0) {
       visit(processId, entry->path());
     }
