@@ -110,8 +110,12 @@ int Protocol_LOKA::Start() {
   }
   return Guarded(0, [this] {
     LoadSettings();
-    if (params_.getCommonParams()->autoConnect && !OpenPort()) {
-      return 0;
+    if (params_.getCommonParams()->autoConnect) {
+      // The console may have opened it before, with what was configured then.
+      link_.CloseWithoutSemaphore();
+      if (!OpenPort()) {
+        return 0;
+      }
     }
     taskRunner_.Start();
     started_ = true;

@@ -112,6 +112,42 @@ TEST_F(LifecycleTest, WithoutAutoConnectThePortStaysClosed) {
   EXPECT_EQ(Calls(), "StopTask 1000 -> 1\n");
 }
 
+// The console may have opened the port before, with other settings: Start opens it as configured
+// and overridden.
+TEST_F(LifecycleTest, StartOpensAnOpenPortAnew) {
+  host_.Storage().Put("LOKA", "baud", 300);
+  ASSERT_TRUE(P().Config(Mandatory()));
+  char reply[40] = {};
+  ASSERT_TRUE(P()->DoCommand("connect ON", reply, sizeof reply));
+  EXPECT_EQ(Calls(), "port.Lock\nOpenPort com1\nSetup 9600 1 8 1 0\nport.Unlock\n");
+  EXPECT_NE(P()->Start(), 0);
+  const std::string calls = Calls();
+  EXPECT_EQ(calls.substr(calls.find("ReleasePort")),
+            "ReleasePort com1\nOpenPort com1\nSetup 300 1 8 1 0\nCreateTask 3\ntask.Start\n");
+  EXPECT_TRUE(P().ReadFlag("connect"));
+}
+
+TEST_F(LifecycleTest, AFailedStartLeavesTheLinkClosed) {
+  ASSERT_TRUE(P().Config(Mandatory()));
+  char reply[40] = {};
+  ASSERT_TRUE(P()->DoCommand("connect ON", reply, sizeof reply));
+  host_.Faults().FailAlways("Setup");
+  EXPECT_EQ(P()->Start(), 0);
+  EXPECT_EQ(P().Error(), "-1 Can't open serial port");
+  EXPECT_TRUE(P()->DoCommand("get_stat", reply, sizeof reply));
+  EXPECT_STREQ(reply, "Disconnected");
+}
+
+TEST_F(LifecycleTest, StartWithoutAutoConnectKeepsAnOpenPort) {
+  ASSERT_TRUE(P().Config(Mandatory("autoConnect=false")));
+  char reply[40] = {};
+  ASSERT_TRUE(P()->DoCommand("connect ON", reply, sizeof reply));
+  Calls();
+  EXPECT_NE(P()->Start(), 0);
+  EXPECT_EQ(Calls(), NoOverrides() + "CreateTask 3\ntask.Start\n");
+  EXPECT_TRUE(P().ReadFlag("connect"));
+}
+
 TEST_F(LifecycleTest, StartWithoutConfig) {
   EXPECT_NE(P()->Start(), 0);
   EXPECT_EQ(Calls(), NoOverrides() + "CreateTask 3\ntask.Start\n");
