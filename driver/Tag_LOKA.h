@@ -53,6 +53,12 @@ class Tag_LOKA : public TagBase {
   int index_ = 0;     // element
   int subIndex_ = 0;  // item or bit within the element
 
+  // What the tag names and how it is seen. No URI leads to combinations that contradict each other;
+  // reads and writes answer them all the same.
+  ICU_Type varType_ = ICU_NONE;
+  MemoryTypeId id_ = MemoryTypeId::kTxToken;
+  bool isSerialParam_ = false;
+
  private:
   bool parseTagUrl(const Protocol_LOKA& protocol);
   bool FindMemory(const Protocol_LOKA& protocol, const std::string& memoryType);
@@ -62,13 +68,10 @@ class Tag_LOKA : public TagBase {
   bool valid_ = false;
   std::string uri_;
   int nodeId_ = 0;
-  ICU_Type varType_ = ICU_NONE;
   int varLength_ = 0;
   ICU_Type itemType_ = ICU_NONE;
   const MemoryType* memoryType_ = nullptr;
   const _LOKA::NodeParams* nodeParams_ = nullptr;
   const _LOKA::CommonParams* commonParams_ = nullptr;
   const Model* model_ = nullptr;
-  MemoryTypeId id_ = MemoryTypeId::kTxToken;
-  bool isSerialParam_ = false;
 };

@@ -98,6 +98,18 @@ TEST(ParamManagerTest, EveryRequiredKeyIsMissed) {
   }
 }
 
+TEST(ParamManagerTest, RequiredKeysAreReadInTheirOrder) {
+  const std::vector<std::string> keys = {"model", "port",     "baudrate", "parity",
+                                         "bits",  "stopbits", "mode"};
+  // Each one alone in front, all behind it missing: the next one is named.
+  std::string cfg = "CfgVer=1";
+  for (const std::string& key : keys) {
+    ExpectRefused(cfg + " hex_tokens=x", "Parser: parameter '" + key + "' is not found");
+    cfg += " " + key + "=1";
+  }
+  ExpectRefused(cfg + " hex_tokens=x", "Parser: parameter 'hex_tokens' has illegal value");
+}
+
 TEST(ParamManagerTest, UnknownFormatIsRefused) {
   ExpectRefused("CfgVer=2 model=1", "Parser: unknown format");
   ExpectRefused("", "Parser: unknown format");
@@ -164,7 +176,9 @@ TEST(ParamManagerTest, SwitchesAreTrueOrFalse) {
 
 TEST(ParamManagerTest, TextsMayHoldSpaces) {
   EXPECT_EQ(Accepted(Without("port") + " port=/dev/my&nbsp;port").port, "/dev/my port");
-  EXPECT_EQ(Accepted("CfgVer=1 model=a&nbsp;b" + std::string(kRequired + 16)).port, "com1");
+  ParamManager params;
+  ASSERT_TRUE(params.parse(("CfgVer=1 model=a&nbsp;b" + std::string(kRequired + 16)).c_str()));
+  EXPECT_EQ(params.getNodeParams(0)->model, "a b");
 }
 
 TEST(ParamManagerTest, FramingTextsAreHexText) {
@@ -227,6 +241,18 @@ TEST(ParamManagerTest, FailedParseKeepsWhatItDidNotReach) {
   EXPECT_EQ(params.getCommonParams()->baudrate, 300);
   EXPECT_EQ(params.getCommonParams()->parity, "even");
   EXPECT_EQ(params.getCommonParams()->gap, 5);
+}
+
+TEST(ParamManagerTest, FailedOptionalKeyHasItsDefaultAndKeepsThoseBehindIt) {
+  ParamManager params;
+  ASSERT_TRUE(params.parse(
+      With("rx_prefix=01 gap=5 hex_tokens=true token_queue_size=7 autoConnect=false").c_str()));
+  EXPECT_FALSE(params.parse(With("gap=6 hex_tokens=x token_queue_size=8").c_str()));
+  EXPECT_EQ(params.getCommonParams()->rx_prefix, "");
+  EXPECT_EQ(params.getCommonParams()->gap, 6);
+  EXPECT_FALSE(params.getCommonParams()->hex_tokens);
+  EXPECT_EQ(params.getCommonParams()->token_queue_size, 7);
+  EXPECT_FALSE(params.getCommonParams()->autoConnect);
 }
 
 TEST(ParamManagerTest, NodesReadBeforeAFailureStay) {
