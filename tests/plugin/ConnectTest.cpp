@@ -23,6 +23,20 @@ TEST_F(ConnectTest, OffAndOn) {
   EXPECT_TRUE(P().ReadFlag("connect"));
 }
 
+// The state changes under the port semaphore, not before.
+TEST_F(ConnectTest, TheFlagChangesUnderThePortSemaphore) {
+  Run();
+  ScriptedSemaphore* port = host_.MultiTask().Semaphore("port");
+  char reply[40] = {};
+  const auto askStatus = [&] { EXPECT_TRUE(P()->DoCommand("get_stat", reply, sizeof reply)); };
+  port->BeforeNthLock(1, askStatus);
+  EXPECT_TRUE(P().WriteFlag("connect", 0));
+  EXPECT_STREQ(reply, "Connected");
+  port->BeforeNthLock(1, askStatus);
+  EXPECT_TRUE(P().WriteFlag("connect", 1));
+  EXPECT_STREQ(reply, "Disconnected");
+}
+
 TEST_F(ConnectTest, AnyNonZeroByteIsOn) {
   Run("autoConnect=false");
   for (const unsigned value : {1U, 2U, 0x80U, 0xFFU}) {

@@ -370,6 +370,18 @@ TEST_F(ReceiveTest, ChangedFramingLeavesATokenThatHasBegun) {
   EXPECT_EQ(P().TakeTokens(), "[B]");
 }
 
+// Whether a token becomes hexadecimal text is decided when it is queued.
+TEST_F(ReceiveTest, HexModeCountsAtTheEndOfAToken) {
+  Run("rx_suffix=03");
+  char reply[40] = {};
+  host_.MultiTask().Semaphore("port")->BeforeNthLock(
+      2, [&] { EXPECT_TRUE(P()->DoCommand("set_hexToken ON", reply, sizeof reply)); });
+  Receive("AB\x03");
+  EXPECT_STREQ(reply, "OK");
+  EXPECT_TRUE(P()->DoCommand("set_hexToken OFF", reply, sizeof reply));
+  EXPECT_EQ(P().TakeTokens(), "[4142]") << "what is queued keeps its form";
+}
+
 TEST_F(ReceiveTest, ADisconnectWithinATokenDropsIt) {
   Run("rx_prefix=02 rx_suffix=03");
   host_.Line().Feed("\x02\x41");

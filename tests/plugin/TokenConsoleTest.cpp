@@ -76,6 +76,31 @@ TEST_F(TokenConsoleTest, ConnectTakesThePortSemaphoreOnly) {
   EXPECT_EQ(Calls(), "port.Lock\nport.Unlock\n");
 }
 
+// A pass of the receive task that waits for the semaphore must find the link closed already.
+TEST_F(TokenConsoleTest, ConnectOffClosesTheLinkBeforeItWaitsForTheSemaphore) {
+  Run();
+  std::string status;
+  host_.MultiTask().Semaphore("port")->BeforeNthLock(1, [&] { status = Command("get_stat").text; });
+  ExpectReply("connect OFF", "OK", true);
+  EXPECT_EQ(status, "Disconnected");
+}
+
+TEST_F(TokenConsoleTest, CommandsBeforeTheStart) {
+  ASSERT_TRUE(P().Config(Mandatory()));
+  ExpectReply("get_stat", "Disconnected", true);
+  ExpectReply("put A", "ERROR: serial port is not active for sending", false);
+  ExpectReply("get", "", true);
+  ExpectReply("connect ON", "OK", true);
+  EXPECT_EQ(Calls(), "port.Lock\nOpenPort com1\nSetup 9600 1 8 1 0\nport.Unlock\n");
+  ExpectReply("put A", "OK", true);
+  EXPECT_EQ(Calls(), "Send 41\n");
+  EXPECT_EQ(P().Error(), "1 ");
+  EXPECT_NE(P()->Stop(), 0);
+  EXPECT_EQ(Calls(), "") << "what was never started is not stopped";
+  P().Delete();
+  EXPECT_EQ(Calls(), "DeleteSemaphore queue\nDeleteSemaphore port\nReleasePort com1\n");
+}
+
 TEST_F(TokenConsoleTest, ConnectWithTheSettingsInEffect) {
   Run();
   Command("connect OFF");
@@ -132,6 +157,7 @@ TEST_F(TokenConsoleTest, PutSendsTheRestOfTheLine) {
       {"put    ", "Send 02 03\n"},
       {"put put", "Send 02 70 75 74 03\n"},
       {"put \ta", "Send 02 09 61 03\n"},
+      {"\tput \ta", "Send 02 09 61 03\n"},
   };
   for (const auto& row : rows) {
     ExpectReply(row.command, "OK", true);
@@ -268,6 +294,12 @@ TEST_F(TokenConsoleTest, HexMode) {
                               "set_hexToken ", "set_hexToken  ON"}) {
     ExpectReply(command, "ERROR: wrong value", true);
   }
+  ExpectReply("set_hexToken ON and more", "OK", true);
+  ExpectReply("set_hexToken off", "ERROR: wrong value", true);
+  Receive(
+      "\x02"
+      "A\x03");
+  EXPECT_EQ(P().TakeTokens(), "[41]") << "a wrong value changes nothing";
 }
 
 TEST_F(TokenConsoleTest, Gap) {
@@ -288,6 +320,10 @@ TEST_F(TokenConsoleTest, Gap) {
   ExpectReply("set_rxGap x", "ERROR: wrong value", true);
   ExpectReply("set_rxGap ", "ERROR: wrong value", true);
   ExpectReply("set_rxGap ms50", "ERROR: wrong value", true);
+  ExpectReply("set_rxGap -", "ERROR: wrong value", true);
+  Calls();
+  host_.RunPasses(1);
+  EXPECT_NE(Calls().find("Receive 200 "), std::string::npos) << "a wrong value changes nothing";
 }
 
 TEST_F(TokenConsoleTest, ReceiveFramingAppliesFromTheNextPassOn) {
