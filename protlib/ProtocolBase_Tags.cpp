@@ -28,8 +28,9 @@ void ProtocolBase::FreeTag(ITag* tag) {
   if (tag == nullptr) {
     return;
   }
-  const std::unique_ptr<TagBase> owner(static_cast<TagBase*>(tag));
-  tags_.Remove(owner.get());
+  // Also for a tag that this driver did not make: the host hands it over to be destroyed.
+  const std::unique_ptr<ITag> owner(tag);
+  tags_.Remove(tag);
 }
 
 void ProtocolBase::DeleteTags() { tags_.DeleteAll(); }

@@ -3,16 +3,16 @@
 
 #include <memory>
 
-#include "protlib/TagBase.h"
+#include "interfaces/ITag.h"
 
-void TagList::Append(TagBase* tag) {
+void TagList::Append(ITag* tag) {
   Entries entry{tag};
   const LeafLock lock(mutex_);
   places_.emplace(tag, entry.begin());
   entries_.splice(entries_.end(), entry);
 }
 
-void TagList::Remove(TagBase* tag) {
+void TagList::Remove(ITag* tag) {
   const LeafLock lock(mutex_);
   const auto places = places_.equal_range(tag);
   for (auto place = places.first; place != places.second; ++place) {
@@ -28,7 +28,7 @@ void TagList::DeleteAll() {
     entries.swap(entries_);
     places_.clear();
   }
-  for (TagBase* tag : entries) {
-    const std::unique_ptr<TagBase> owner(tag);
+  for (ITag* tag : entries) {
+    const std::unique_ptr<ITag> owner(tag);
   }
 }
