@@ -68,6 +68,17 @@ std::string HexBytes(std::string_view bytes) {
   return text;
 }
 
+std::string CompactHex(std::string_view bytes) {
+  std::string text;
+  text.reserve(bytes.size() * 2);
+  for (const char character : bytes) {
+    const auto byte = static_cast<unsigned char>(character);
+    text += kUpperDigits[byte >> 4U];
+    text += kUpperDigits[byte & 0x0FU];
+  }
+  return text;
+}
+
 bool ParseHexBytes(std::string_view text, std::string* bytes) {
   std::string result;
   int high = -1;

@@ -15,6 +15,9 @@ std::string EscapeBytes(std::string_view bytes);
 // Two upper-case hexadecimal digits a byte, separated by blanks: "02 41 42 03".
 std::string HexBytes(std::string_view bytes);
 
+// The same without the blanks: "02414203".
+std::string CompactHex(std::string_view bytes);
+
 // Turns hexadecimal digits, blanks allowed between the bytes, into bytes. False, with `bytes`
 // untouched, for any other character or half a byte.
 bool ParseHexBytes(std::string_view text, std::string* bytes);

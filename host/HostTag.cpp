@@ -77,6 +77,19 @@ bool HostTag::WriteText(const std::string& text) const {
   return Write(value);
 }
 
+bool HostTag::ReadBytes(std::string* bytes) const {
+  std::vector<unsigned char> value(ValueBytes(tag_) + 1, 0);
+  if (protocol_->Read(tag_, value.data()) == 0) {
+    return false;
+  }
+  bytes->assign(value.begin(), value.end() - 1);
+  return true;
+}
+
+bool HostTag::WriteBytes(const std::string& bytes) const {
+  return bytes.size() == ValueBytes(tag_) && Write(bytes);
+}
+
 bool HostTag::Write(const std::string& value) const {
   const std::vector<unsigned char> bytes(value.begin(), value.end());
   // Ends after the driver has let its semaphore go; only then is the disk touched. A failure to

@@ -30,6 +30,13 @@ class HostTag {
   // holds a zero byte.
   bool WriteText(const std::string& text) const;
 
+  // For tags of every type: the host value as it stands, GetVarLength bytes.
+  bool ReadBytes(std::string* bytes) const;
+  // Fails without asking the driver for any other number of bytes.
+  bool WriteBytes(const std::string& bytes) const;
+
+  const ITag& Tag() const { return *tag_; }
+
   // The driver's error text, as it stands. Empty for refusals that the driver does not explain.
   std::string Error() const;
 
