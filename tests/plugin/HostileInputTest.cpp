@@ -275,7 +275,13 @@ TEST_P(MissingSemaphoreTest, NothingBreaks) {
 
 INSTANTIATE_TEST_SUITE_P(Which, MissingSemaphoreTest,
                          ::testing::Values(std::vector<int>{1}, std::vector<int>{2},
-                                           std::vector<int>{1, 2}));
+                                           std::vector<int>{1, 2}),
+                         [](const auto& missing) {
+                           std::string name;
+                           if (missing.param.front() == 1) name += "Queue";
+                           if (missing.param.back() == 2) name += "Port";
+                           return name;
+                         });
 
 // One life of a protocol with every operation that calls the host, so that each of its calls can be
 // made to fail once.

@@ -2,6 +2,8 @@
 // The module: obtaining and releasing the host's services.
 #include <gtest/gtest.h>
 
+#include <ostream>
+
 #include "tests/support/PluginUnderTest.h"
 #include "tests/support/ScriptedHost.h"
 
@@ -73,11 +75,31 @@ TEST_F(ModuleTest, OptionalServicesMayBeAbsent) {
             "ReleaseInterface ISocketFactory\nReleaseInterface ICDSBuffer\n");
 }
 
+// Each of them alone: the others are still obtained, and exactly these are released.
+TEST_F(ModuleTest, EachOptionalServiceMayBeAbsent) {
+  for (const std::string name :
+       {"IDiag", "IPermanentStorage", "IDriverInterface", "ISmux", "IFastTimer"}) {
+    host_.SetAbsent(name);
+    EXPECT_EQ(Init(&host_), 1) << name;
+    std::string asked = kAllAsked;
+    asked.insert(asked.find(name) + name.size(), " -> null");
+    EXPECT_EQ(Calls(), asked);
+    Close();
+    const std::string line = "ReleaseInterface " + name + "\n";
+    std::string others = kAllReleased;
+    others.erase(others.find(line), line.size());
+    EXPECT_EQ(Calls(), others);
+    host_.SetPresent(name);
+  }
+}
+
 struct MissingService {
   const char* service;
   const char* calls;
   const char* text;
 };
+
+void PrintTo(const MissingService& missing, std::ostream* out) { *out << missing.service; }
 
 class MissingServiceTest : public ModuleTest,
                            public ::testing::WithParamInterface<MissingService> {};
