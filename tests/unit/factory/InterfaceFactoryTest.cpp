@@ -3,6 +3,7 @@
 
 #include "factory/InterfaceFactory.h"
 #include "interfaces/IProtocol.h"
+#include "tests/unit/FailingNew.h"
 
 extern "C" IInterfaceFactory* GetInterfaceFactory();
 
@@ -43,4 +44,13 @@ TEST(InterfaceFactoryTest, ReleasingChangesNothing) {
   factory.ReleaseInterface(nullptr);
   EXPECT_EQ(factory.CreateInterface("IProtocolFactory"), protocols);
   EXPECT_EQ(protocols->ConvertTo("ProtocolFactory"), protocols);
+}
+
+TEST(InterfaceFactoryTest, AsksForNoMemory) {
+  const long long before = FailingNew::Count();
+  IInterfaceFactory* const factory = GetInterfaceFactory();
+  for (const char* name : {"IProtocolFactory", "ProtModule", "a name that nobody knows at all"}) {
+    factory->ReleaseInterface(factory->CreateInterface(name));
+  }
+  EXPECT_EQ(FailingNew::Count(), before);
 }

@@ -4,6 +4,7 @@
 #include "factory/ProtocolFactory.h"
 #include "interfaces/IProtocol.h"
 #include "tests/unit/FailingNew.h"
+#include "tests/unit/FakeDriver.h"
 #include "tests/unit/HostInUse.h"
 #include "tests/unit/QuietHost.h"
 
@@ -48,6 +49,24 @@ TEST(ProtocolFactoryTest, CreatesNothingElse) {
 TEST(ProtocolFactoryTest, DeletingNothingDoesNothing) {
   ProtocolFactory factory;
   factory.DeleteProtocol(nullptr);
+}
+
+// No list of its own protocols stands in the way: the object's own destructor does it.
+TEST(ProtocolFactoryTest, DeletesWhateverItIsGiven) {
+  class Leaving final : public FakeDriver {
+   public:
+    explicit Leaving(bool& isGone) : isGone_(isGone) {}
+    ~Leaving() override { isGone_ = true; }
+    Leaving(const Leaving&) = delete;
+    Leaving& operator=(const Leaving&) = delete;
+
+   private:
+    bool& isGone_;
+  };
+  bool isGone = false;
+  ProtocolFactory factory;
+  factory.DeleteProtocol(new Leaving(isGone));
+  EXPECT_TRUE(isGone);
 }
 
 TEST(ProtocolFactoryTest, WithoutMemoryThereIsNoProtocol) {

@@ -120,6 +120,15 @@ TEST(ProtUtilsNTypesTest, EnumeratorsHaveTheCodesOfTheHost) {
   EXPECT_EQ(ICU_BINARY, 11);
   EXPECT_EQ(ICU_TIME, 12);
   EXPECT_EQ(ICU_BOOLEAN_ARRAY, 13);
+  EXPECT_EQ(ICU_BYTE_ARRAY, 14);
+  EXPECT_EQ(ICU_SHORT_ARRAY, 15);
+  EXPECT_EQ(ICU_INT_ARRAY, 16);
+  EXPECT_EQ(ICU_UNSIGNED_BYTE_ARRAY, 17);
+  EXPECT_EQ(ICU_UNSIGNED_SHORT_ARRAY, 18);
+  EXPECT_EQ(ICU_UNSIGNED_INT_ARRAY, 19);
+  EXPECT_EQ(ICU_FLOAT_ARRAY, 20);
+  EXPECT_EQ(ICU_DOUBLE_ARRAY, 21);
+  EXPECT_EQ(ICU_TIME_ARRAY, 22);
   EXPECT_EQ(ICU_UINT64, 23);
   EXPECT_EQ(ICU_INT64, 24);
   EXPECT_EQ(ICU_UINT64_ARRAY, 25);
@@ -263,6 +272,13 @@ TEST(ProtUtilsNTypesTest, ConversionsAreAppended) {
   EXPECT_EQ(params, (Texts{"old", "new"}));
 }
 
+// The parentheses are cut before the name is looked up.
+TEST(ProtUtilsNTypesTest, ConversionsOfAnUnknownNameAreStillGiven) {
+  ExpectUnknown("nosuch(a,b)");
+  EXPECT_EQ(Parse("nosuch(a,b)").params, (Texts{"a", "b"}));
+  EXPECT_EQ(Parse("(neg)").params, Texts{"neg"});
+}
+
 // --- names ---
 
 TEST(ProtUtilsNTypesTest, NameExamples) {
@@ -309,6 +325,11 @@ TEST(ProtUtilsNTypesTest, ItemCounts) {
   EXPECT_EQ(ProtUtilsN::GetItemCount(10, Type(4)), 2);
   EXPECT_EQ(ProtUtilsN::GetItemCount(0, Type(4)), 0);
   EXPECT_EQ(ProtUtilsN::GetItemCount(29, Type(12)), 2);
+  for (const ExpectedRow& row : kRows) {
+    EXPECT_EQ(ProtUtilsN::GetItemCount(50, Type(row.code)),
+              row.elementBytes == 0 ? 1 : 50 / row.elementBytes)
+        << row.name;
+  }
   for (const int codeWithoutLength : {10, 25, 27, 28}) {
     EXPECT_EQ(ProtUtilsN::GetItemCount(10, Type(codeWithoutLength)), 1) << codeWithoutLength;
   }

@@ -21,14 +21,22 @@ class DatagramDriver final : public FakeDriver {
     seenSecond = second;
     return coexist;
   }
-  int MaxDatagramItems(const ITag* /*tag*/) const override { return maxItems; }
-  int MaxDatagramLength(const ITag* /*tag*/) const override { return maxLength; }
+  int MaxDatagramItems(const ITag* tag) const override {
+    seenForItems = tag;
+    return maxItems;
+  }
+  int MaxDatagramLength(const ITag* tag) const override {
+    seenForLength = tag;
+    return maxLength;
+  }
 
   bool coexist = true;
   int maxItems = 3;
   int maxLength = 100;
   mutable const ITag* seenFirst = nullptr;
   mutable const ITag* seenSecond = nullptr;
+  mutable const ITag* seenForItems = nullptr;
+  mutable const ITag* seenForLength = nullptr;
 };
 
 // A field of the tag's URI, "(null)" without one.
@@ -273,6 +281,8 @@ TEST(ProtocolBaseTagsTest, CandidateMayJoinUpToTheLimits) {
   EXPECT_TRUE(driver.CanAddToDatagram(tags, 2, &candidate));  // 100 bytes of 100
   EXPECT_EQ(driver.seenFirst, &first);
   EXPECT_EQ(driver.seenSecond, &candidate);
+  EXPECT_EQ(driver.seenForItems, &candidate);
+  EXPECT_EQ(driver.seenForLength, &candidate);
   driver.maxLength = 99;
   EXPECT_FALSE(driver.CanAddToDatagram(tags, 2, &candidate));
   EXPECT_TRUE(driver.CanAddToDatagram(tags, 1, &candidate));
@@ -288,6 +298,30 @@ TEST(ProtocolBaseTagsTest, CandidateThatCannotCoexistMayNotJoin) {
   const ITag* const tags[] = {&tag};
   driver.coexist = false;
   EXPECT_FALSE(driver.CanAddToDatagram(tags, 1, &tag));
+}
+
+TEST(ProtocolBaseTagsTest, DatagramLengthsAreThoseInTheDevice) {
+  DatagramDriver driver;
+  const FakeTag bits("boolean-16");  // 16 bytes of value, 2 in the device
+  const ITag* const tags[] = {&bits, &bits};
+  driver.maxLength = 6;
+  EXPECT_TRUE(driver.CanAddToDatagram(tags, 2, &bits));
+  driver.maxLength = 5;
+  EXPECT_FALSE(driver.CanAddToDatagram(tags, 2, &bits));
+}
+
+// Limits that a driver does not set are 0, so agreeing to coexist alone opens no datagram.
+TEST(ProtocolBaseTagsTest, NothingJoinsWithoutLimits) {
+  DatagramDriver driver;
+  const FakeTag tag("string-0");
+  const ITag* const tags[] = {&tag};
+  driver.maxItems = 0;
+  EXPECT_FALSE(driver.CanAddToDatagram(tags, 1, &tag));
+  driver.maxItems = 2;
+  driver.maxLength = 0;
+  EXPECT_TRUE(driver.CanAddToDatagram(tags, 1, &tag));
+  const FakeTag longer("byte");
+  EXPECT_FALSE(driver.CanAddToDatagram(tags, 1, &longer));
 }
 
 TEST(ProtocolBaseTagsTest, DatagramLengthsDoNotOverflow) {

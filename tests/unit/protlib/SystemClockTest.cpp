@@ -15,10 +15,17 @@ unsigned long long WallClockMs() {
 
 }  // namespace
 
-TEST(SystemClockTest, CountsMillisecondsOfTheSystemClock) {
-  const unsigned long long before = WallClockMs();
-  const unsigned long long stamp = currentTimeStamp();
-  const unsigned long long after = WallClockMs();
-  EXPECT_GE(stamp, before);
-  EXPECT_LE(stamp, after);
+// Asked until the clock has gone through some whole milliseconds, so that a stamp that is rounded
+// up instead of cut would be seen ahead of the clock.
+TEST(SystemClockTest, CountsWholeMillisecondsOfTheSystemClock) {
+  constexpr unsigned long long kObservedMs = 3;
+  const unsigned long long end = WallClockMs() + kObservedMs;
+  unsigned long long after = 0;
+  do {
+    const unsigned long long before = WallClockMs();
+    const unsigned long long stamp = currentTimeStamp();
+    after = WallClockMs();
+    ASSERT_GE(stamp, before);
+    ASSERT_LE(stamp, after);
+  } while (after < end);
 }
