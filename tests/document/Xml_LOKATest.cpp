@@ -53,6 +53,32 @@ Attributes AttributesOf(const pugi::xml_node& node) {
   return attributes;
 }
 
+// The text of an element as the document is laid out: two blanks a level, each child on a line of
+// its own, but the first child directly behind the element's text when it has one. An element
+// without anything in it is closed at once.
+std::string Laid(const pugi::xml_node& node, const std::string& indent) {
+  const std::string name = node.name();
+  std::string out = "<" + name;
+  for (const auto& attribute : AttributesOf(node)) {
+    out += " " + attribute.first + "=\"" + attribute.second + "\"";
+  }
+  const bool isEmptyText = name == "compatibilityCode";
+  if (!node.first_child() && !isEmptyText) return out + "/>";
+  const std::string text = node.child_value();
+  out += ">" + text;
+  bool isBehindText = !text.empty();
+  bool hasElements = false;
+  for (const pugi::xml_node& child : node.children()) {
+    if (child.type() != pugi::node_element) continue;
+    if (!isBehindText) out += "\n" + indent + "  ";
+    out += Laid(child, indent + "  ");
+    isBehindText = false;
+    hasElements = true;
+  }
+  if (hasElements) out += "\n" + indent;
+  return out + "</" + name + ">";
+}
+
 std::vector<std::string> Entries(const pugi::xml_node& parameter) {
   std::vector<std::string> entries;
   for (const pugi::xml_node& entry : parameter.children("list_entry")) {
@@ -92,6 +118,10 @@ TEST_F(Xml_LOKATest, SectionsInOrder) {
             "usesDoCommand usesExtend inheritsProtgen usesOfflineOpt name display "
             "compatibilityCode displayDlgTitle protGenVer code maxDisplayRows defaultOrt "
             "minimumOrt defaultRpt parameters memtypes tag_uri models conversions ");
+}
+
+TEST_F(Xml_LOKATest, IsLaidOutAsTheHostsToolWritesIt) {
+  EXPECT_EQ(Document(), "<?xml version=\"1.0\" encoding=\"utf-8\"?>\n" + Laid(root_, "") + "\n");
 }
 
 TEST_F(Xml_LOKATest, FlagsAndIdentity) {
@@ -203,6 +233,18 @@ TEST_F(Xml_LOKATest, ParameterAttributes) {
   }
 }
 
+TEST_F(Xml_LOKATest, OnlyListParametersHaveEntries) {
+  for (const pugi::xml_node& parameter : root_.child("parameters").children()) {
+    const bool isList = std::string(parameter.attribute("type").value()) == "prop_list";
+    EXPECT_EQ(static_cast<bool>(parameter.child("list_entry")), isList) << parameter.child_value();
+    for (const pugi::xml_node& child : parameter.children()) {
+      if (child.type() != pugi::node_element) continue;
+      EXPECT_STREQ(child.name(), "list_entry");
+      EXPECT_FALSE(child.first_attribute());
+    }
+  }
+}
+
 // What the parser takes when an optional key is absent is what the document gives as its default.
 TEST_F(Xml_LOKATest, OptionalDefaultsAreThoseOfTheParser) {
   _LOKA::ParamManager params;
@@ -225,6 +267,9 @@ TEST_F(Xml_LOKATest, ListsAreWhatTheDriverAccepts) {
   EXPECT_EQ(Entries(Parameter("port")), ports);
   EXPECT_EQ(Entries(Parameter("bits")), (std::vector<std::string>{"7", "8"}));
   EXPECT_EQ(Entries(Parameter("stopbits")), (std::vector<std::string>{"1", "2"}));
+  EXPECT_EQ(Entries(Parameter("baudrate")),
+            (std::vector<std::string>{"150", "300", "600", "1200", "2400", "4800", "9600", "19200",
+                                      "38400", "57600", "115200"}));
   int listed = 0;
   for (const std::string& rate : Entries(Parameter("baudrate"))) {
     EXPECT_TRUE(IsListedBaudrate(std::stoi(rate))) << rate;
