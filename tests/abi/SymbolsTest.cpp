@@ -24,28 +24,42 @@ bool Has(const Lines& lines, const std::string& part) {
 TEST(SymbolsTest, ExportsTheEntryPointAndTheUtilitiesOnly) {
   const Lines exported = Nm("--defined-only");
   EXPECT_EQ(UnexpectedExports(exported), Lines());
-  for (const char* name : {" T GetInterfaceFactory",
-                           "ProtUtilsN::GetVADOType(",
-                           "ProtUtilsN::GetVADOName[abi:cxx11](",
-                           "ProtUtilsN::GetDataLength(",
-                           "ProtUtilsN::GetTypeFlag(",
-                           "ProtUtilsN::IsBitType(",
-                           "ProtUtilsN::GetItemCount(",
-                           "ProtUtilsN::GetBasicType(",
-                           "ProtUtilsN::GetBasicLength(",
-                           "ProtUtilsN::GetVersion(",
-                           "ProtUtilsN::GetLenOfBits(",
-                           "ProtUtilsN::UnpackBits(",
-                           "ProtUtilsN::PackBits(",
-                           "ProtUtilsN::CopyBits(",
-                           "ProtUtilsN::shiftBits(",
-                           "ProtUtilsN::getStartingBit(",
-                           "ProtUtilsN::getEndingBit(",
-                           "ProtUtilsN::GetConfigValue(",
-                           "ProtUtilsN::Trim(",
-                           "ProtUtilsN::GetTrim(",
-                           "ProtUtilsN::ParseSubstrings("}) {
-    EXPECT_TRUE(Has(exported, name)) << name;
+  const std::string text =
+      "std::__cxx11::basic_string<char, std::char_traits<char>, std::allocator<char> >";
+  const std::string texts = "std::vector<" + text + ", std::allocator<" + text + " > >&";
+  const Lines names = {
+      "GetInterfaceFactory",
+      "ProtUtilsN::GetVADOType(" + text + " const&, ICU_Type&, ICU_Type&, int&, " + texts + ")",
+      "ProtUtilsN::GetVADOName[abi:cxx11](ICU_Type, int)",
+      "ProtUtilsN::GetDataLength(ICU_Type)",
+      "ProtUtilsN::GetTypeFlag(ICU_Type)",
+      "ProtUtilsN::IsBitType(ICU_Type)",
+      "ProtUtilsN::IsBitType(ITag const*)",
+      "ProtUtilsN::GetItemCount(int, ICU_Type)",
+      "ProtUtilsN::GetItemCount(ITag const*)",
+      "ProtUtilsN::GetBasicType(ITag const*)",
+      "ProtUtilsN::GetBasicLength(ITag const*)",
+      "ProtUtilsN::GetVersion()",
+      "ProtUtilsN::GetLenOfBits(int, int)",
+      "ProtUtilsN::UnpackBits(unsigned char*, unsigned char const*, int, int)",
+      "ProtUtilsN::PackBits(unsigned char*, unsigned char const*, int, int)",
+      "ProtUtilsN::CopyBits(unsigned char*, unsigned char const*, int, int)",
+      "ProtUtilsN::shiftBits(unsigned char*, int, unsigned char const*, int, int)",
+      "ProtUtilsN::getStartingBit(ITag const*)",
+      "ProtUtilsN::getEndingBit(ITag const*)",
+      "ProtUtilsN::GetConfigValue(char const*, char const*, " + text + "&)",
+      "ProtUtilsN::Trim(" + text + "&)",
+      "ProtUtilsN::GetTrim(" + text + " const&)",
+      "ProtUtilsN::ParseSubstrings(" + text + " const&, " + texts + ", char)"};
+  for (const std::string& name : names) {
+    EXPECT_EQ(std::count_if(exported.begin(), exported.end(),
+                            [&](const std::string& line) {
+                              const std::string end = " T " + name;
+                              return line.size() > end.size() &&
+                                     line.compare(line.size() - end.size(), end.size(), end) == 0;
+                            }),
+              1)
+        << name;
   }
 }
 
