@@ -11,6 +11,8 @@
 #include "host/DemoSteps.h"
 #include "host/ExitStatus.h"
 #include "host/WatchCommand.h"
+#include "host/commands/ConfigCommand.h"
+#include "host/commands/ExplainCommand.h"
 
 namespace {
 
@@ -21,6 +23,8 @@ constexpr const char* kExitText =
 
 // Everything that the commands take from the command line.
 struct Arguments {
+  ExplainOptions explain;
+  ConfigOptions config;
   WatchOptions watch;
   std::string demoPlugin;
   std::string restartedPlugin;
@@ -73,6 +77,12 @@ int Dispatch(const CLI::App& app, const Arguments& arguments) {
   if (app.got_subcommand("watch")) {
     return RunWatch(arguments.watch);
   }
+  if (app.got_subcommand("explain")) {
+    return RunExplain(arguments.explain);
+  }
+  if (app.got_subcommand("config")) {
+    return RunConfig(arguments.config);
+  }
   if (app.got_subcommand("demo")) {
     return RunDemo(arguments.demoPlugin);
   }
@@ -93,6 +103,8 @@ int RunCommandLine(int argumentCount, const char* const* arguments) {
     app.require_subcommand(0, 1);
     Arguments values;
     AddWatch(&app, &values);
+    AddExplain(&app, &values.explain);
+    AddConfig(&app, &values.config);
     AddDemo(&app, &values);
     try {
       app.parse(argumentCount, arguments);

@@ -6,6 +6,7 @@
 #include <cctype>
 #include <cstddef>
 
+#include "host/ByteText.h"
 #include "host/framing/FramingSettings.h"
 
 namespace {
@@ -81,7 +82,7 @@ bool ParseControlText(std::string_view text, std::string* bytes, std::string* er
     const std::size_t end = std::min(text.find_first_of(kSeparators, at), text.size());
     const std::string_view word = text.substr(at, end - at);
     if (!AppendWord(word, &result)) {
-      *error = "\"" + std::string(word) +
+      *error = "\"" + EscapeBytes(word) +
                "\" is neither pairs of hexadecimal digits nor the name of a control byte (STX, "
                "ETX, CR, LF, CRLF, ... or none)";
       return false;

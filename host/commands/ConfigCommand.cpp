@@ -1,0 +1,111 @@
+// SPDX-License-Identifier: Apache-2.0
+#include "host/commands/ConfigCommand.h"
+
+#include <CLI/CLI.hpp>
+#include <array>
+#include <cstdio>
+
+#include "host/ByteText.h"
+#include "host/ExitStatus.h"
+#include "host/HostSession.h"
+#include "host/framing/ConfigEdit.h"
+#include "host/framing/ConfigReport.h"
+#include "interfaces/IProtocol.h"
+#include "interfaces/IProtocol5.h"
+
+namespace {
+
+void Tell(const std::string& text) { (void)std::fprintf(stderr, "loka: %s\n", text.c_str()); }
+
+int Fail(ExitStatus status, const std::string& text) {
+  Tell(text);
+  return static_cast<int>(status);
+}
+
+void AddInput(CLI::App* command, ConfigOptions* options, ConfigOptions::Action action) {
+  command
+      ->add_option("CONFIG", options->configurationWord, "Configuration: text, FILE or - (stdin)")
+      ->type_name("")
+      ->required();
+  command->callback([options, action] { options->action = action; });
+}
+
+// The driver's own list of what it took, empty when it does not tell.
+std::string ComParams(IProtocol* protocol) {
+  const auto* const protocol5 = static_cast<const IProtocol5*>(protocol->ConvertTo("IProtocol5"));
+  std::array<char, 512> text{};
+  if (protocol5 == nullptr ||
+      protocol5->vcsGetComParams(text.data(), static_cast<int>(text.size()) - 1) == 0) {
+    return {};
+  }
+  return text.data();
+}
+
+int Check(const ConfigOptions& options, const std::string& configuration) {
+  HostOptions host;
+  host.pluginFile = options.pluginFile;
+  HostSession session(host);
+  HostResult result = session.Open();
+  if (result.IsDone()) {
+    result = session.Configure(configuration);
+  }
+  for (const std::string& note : ConfigNotes(configuration)) {
+    Tell(note);
+  }
+  if (!result.IsDone()) {
+    return Fail(result.status, result.text);
+  }
+  (void)std::printf("ok  %s\n", ConfigLine(configuration, ComParams(session.Protocol())).c_str());
+  return static_cast<int>(ExitStatus::kDone);
+}
+
+int Show(const std::string& configuration) {
+  for (const std::string& line : ConfigTable(configuration)) {
+    (void)std::printf("%s\n", line.c_str());
+  }
+  for (const std::string& note : ConfigNotes(configuration)) {
+    Tell(note);
+  }
+  return static_cast<int>(ExitStatus::kDone);
+}
+
+int New(const ConfigOptions& options) {
+  const std::string configuration = options.framing.Configuration();
+  (void)std::printf("%s\n", configuration.c_str());
+  Tell(ConfigLine(configuration, ""));
+  return static_cast<int>(ExitStatus::kDone);
+}
+
+}  // namespace
+
+void AddConfig(CLI::App* app, ConfigOptions* options) {
+  CLI::App* const config = app->add_subcommand("config", "Make, check or explain configurations");
+  config->require_subcommand(1);
+  config->footer("Example: loka config new -b 9600 -d 7 -p even --rx-prefix STX --rx-suffix ETX");
+  CLI::App* const make = config->add_subcommand("new", "Print a configuration made of flags");
+  options->framing.AddAll(make);
+  options->framing.AddConfiguring(make);
+  make->callback([options] { options->action = ConfigOptions::Action::kNew; });
+  make->footer("Example: loka config new -b 9600 -d 7 -p even --rx-prefix STX --rx-suffix ETX");
+  CLI::App* const check = config->add_subcommand("check", "Let the driver judge a configuration");
+  AddInput(check, options, ConfigOptions::Action::kCheck);
+  check->add_option("--plugin", options->pluginFile, "Driver to ask")->type_name("FILE");
+  check->footer("Example: loka config new -b 9600 --rx-suffix CR | loka config check -");
+  CLI::App* const show = config->add_subcommand("show", "Explain a configuration key by key");
+  AddInput(show, options, ConfigOptions::Action::kShow);
+  show->footer("Example: loka config new -b 9600 --rx-suffix CR | loka config show -");
+}
+
+int RunConfig(const ConfigOptions& options) {
+  (void)std::setvbuf(stdout, nullptr, _IOLBF, BUFSIZ);
+  if (options.action == ConfigOptions::Action::kNew) {
+    return New(options);
+  }
+  std::string configuration;
+  std::string error;
+  if (!ReadConfiguration(options.configurationWord, &configuration, &error)) {
+    return Fail(ExitStatus::kUsage, EscapeBytes(error));
+  }
+  return options.action == ConfigOptions::Action::kCheck ? Check(options, configuration)
+                                                         : Show(configuration);
+}
