@@ -6,10 +6,16 @@
 #include <utility>
 
 #include "host/Deadline.h"
+#include "host/port/ErrorName.h"
 
 namespace {
 
 constexpr int kAskAgainMs = 100;
+
+std::string LossText(const std::string& why, int errorNumber) {
+  const std::string name = ErrorName(errorNumber);
+  return name.empty() ? why : why + ", " + name;
+}
 
 }  // namespace
 
@@ -29,8 +35,14 @@ void HostEvents::OnReceivePause(const ReceiveProgress& progress) {
   }
 }
 
-void HostEvents::OnLineLost(const std::string& path, const std::string& why) {
-  OnPortNote(path + ": line lost (" + why + "); waiting for it to come back");
+void HostEvents::OnLineLost(const std::string& path, const std::string& why, int errorNumber) {
+  OnPortNote(path + ": line lost (" + LossText(why, errorNumber) +
+             "); waiting for it to come back");
+}
+
+void HostEvents::OnLineGone(const std::string& path, const std::string& why, int errorNumber) {
+  OnPortNote(path + ": line lost (" + LossText(why, errorNumber) +
+             "); not opened again (reconnect=off)");
 }
 
 void HostEvents::OnLineBack(const std::string& path) {

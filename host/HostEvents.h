@@ -21,7 +21,8 @@ class HostEvents final : public PortObserver {
   explicit HostEvents(NoteHandler onNote);
 
   void OnReceivePause(const ReceiveProgress& progress) override;
-  void OnLineLost(const std::string& path, const std::string& why) override;
+  void OnLineLost(const std::string& path, const std::string& why, int errorNumber) override;
+  void OnLineGone(const std::string& path, const std::string& why, int errorNumber) override;
   void OnLineBack(const std::string& path) override;
   void OnPortNote(const std::string& text) override;
 

@@ -6,6 +6,7 @@
 #include <algorithm>
 #include <array>
 
+#include "host/port/PortOptions.h"
 #include "interfaces/ISerialPort.h"
 
 namespace {
@@ -93,6 +94,23 @@ bool BuildTermios(const LineSettings& settings, termios* line) {
   line->c_cflag |= settings.stopBits == 2 ? CSTOPB : 0U;
   line->c_cflag |= ParityFlags(settings.parity);
   return cfsetispeed(line, rate->code) == 0 && cfsetospeed(line, rate->code) == 0;
+}
+
+void AddLineOptions(const PortOptions& options, termios* line) {
+  constexpr cc_t kXon = 0x11;
+  constexpr cc_t kXoff = 0x13;
+  if (options.flow == PortOptions::Flow::kRtsCts) {
+    line->c_cflag |= CRTSCTS;
+  } else if (options.flow == PortOptions::Flow::kXonXoff) {
+    line->c_iflag |= IXON | IXOFF;
+    line->c_cc[VSTART] = kXon;
+    line->c_cc[VSTOP] = kXoff;
+  }
+  if (options.hupcl == PortOptions::Level::kOn) {
+    line->c_cflag |= HUPCL;
+  } else if (options.hupcl == PortOptions::Level::kOff) {
+    line->c_cflag &= ~static_cast<tcflag_t>(HUPCL);
+  }
 }
 
 std::string DescribeLine(const LineSettings& settings) {

@@ -3,6 +3,7 @@
 
 #include <string>
 
+struct PortOptions;
 struct termios;
 
 // The numbers of a serial line as ISerialPort::Setup passes them.
@@ -28,6 +29,10 @@ void BuildRawMode(termios* line);
 // Raw mode plus rate and character format. Mark and space parity use CMSPAR (termios(3)). Returns
 // false and leaves `line` alone when the settings are not valid. Any thread.
 bool BuildTermios(const LineSettings& settings, termios* line);
+
+// Adds what the port's options say about flow control and about closing (CRTSCTS, IXON and IXOFF,
+// HUPCL; termios(3)) to a raw line. Any thread.
+void AddLineOptions(const PortOptions& options, termios* line);
 
 // "9600 7E1 RS-232". Any thread.
 std::string DescribeLine(const LineSettings& settings);

@@ -6,17 +6,18 @@
 
 #include <cerrno>
 
+#include "host/port/TerminalCalls.h"
 #include "interfaces/ISerialPort.h"
 
 namespace {
-
-bool NeedsDirection(int mode) { return mode == kModeRs485 || mode == kModeRs485P; }
 
 bool IsUnsupported(int errorNumber) {
   return errorNumber == ENOTTY || errorNumber == ENOSYS || errorNumber == EOPNOTSUPP;
 }
 
 }  // namespace
+
+bool NeedsDirection(int mode) { return mode == kModeRs485 || mode == kModeRs485P; }
 
 void BuildRs485Settings(int mode, serial_rs485* settings) {
   *settings = serial_rs485{};
@@ -25,9 +26,9 @@ void BuildRs485Settings(int mode, serial_rs485* settings) {
   }
 }
 
-Rs485Outcome ApplyRs485(int fileDescriptor, int mode) {
+Rs485Outcome ApplyRs485(const TerminalCalls& calls, int fileDescriptor, int mode) {
   serial_rs485 current{};
-  if (ioctl(fileDescriptor, TIOCGRS485, &current) != 0) {
+  if (calls.Ioctl(fileDescriptor, TIOCGRS485, &current) != 0) {
     if (!NeedsDirection(mode)) {
       return Rs485Outcome::kDone;
     }
@@ -39,7 +40,7 @@ Rs485Outcome ApplyRs485(int fileDescriptor, int mode) {
   }
   serial_rs485 wanted{};
   BuildRs485Settings(mode, &wanted);
-  if (ioctl(fileDescriptor, TIOCSRS485, &wanted) == 0) {
+  if (calls.Ioctl(fileDescriptor, TIOCSRS485, &wanted) == 0) {
     return Rs485Outcome::kDone;
   }
   return IsUnsupported(errno) ? Rs485Outcome::kNotSupported : Rs485Outcome::kFailed;

@@ -1,12 +1,11 @@
 // SPDX-License-Identifier: Apache-2.0
 #pragma once
 
-#include <string>
-
 struct serial_rs485;
+class TerminalCalls;
 
 // Direction control of RS-485 lines by the kernel (TIOCGRS485 and TIOCSRS485, documented with the
-// kernel under "serial-rs485"). LinuxRs485.cpp is the only host file that sees a kernel header.
+// kernel under "serial-rs485").
 
 // Fills in what the kernel needs for a mode code (SerialMode). RS-485 and RS-485P: the driver is
 // switched on by RTS while sending and off afterwards, the receiver is off meanwhile, no extra
@@ -21,4 +20,8 @@ enum class Rs485Outcome {
 
 // Sets the direction control of an open port. Many adapters turn around on their own and know no
 // such request: that is kNotSupported, and for RS-232 and RS-422 kDone. Host threads.
-Rs485Outcome ApplyRs485(int fileDescriptor, int mode);
+Rs485Outcome ApplyRs485(const TerminalCalls& calls, int fileDescriptor, int mode);
+
+// Whether a mode code (SerialMode) is one in which somebody has to switch the direction. Any
+// thread.
+bool NeedsDirection(int mode);

@@ -69,3 +69,22 @@ std::vector<ListedPort> ListPorts(const std::string& classFolder, const std::str
   stable.insert(stable.end(), plain.begin(), plain.end());
   return stable;
 }
+
+std::string StableNameOf(const std::string& path, const std::string& deviceRoot) {
+  std::error_code error;
+  const fs::path device = fs::canonical(path, error);
+  if (error) {
+    return {};
+  }
+  for (const fs::path& link : EntriesOf(fs::path(deviceRoot) / "serial" / "by-id")) {
+    if (fs::canonical(link, error) == device && !error) {
+      return link.string();
+    }
+  }
+  return {};
+}
+
+bool HasChangingName(const std::string& path) {
+  const std::string name = fs::path(path).filename().string();
+  return name.rfind("ttyUSB", 0) == 0 || name.rfind("ttyACM", 0) == 0;
+}

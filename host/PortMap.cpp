@@ -18,26 +18,30 @@ bool IsPortName(const std::string& name) {
 
 bool PortMap::Add(const std::string& word, std::string* error) {
   const std::size_t equals = word.find('=');
-  // A slash in front of the sign belongs to a path: /dev/serial/by-id/a=b is a bare path.
-  const bool isNamed = equals != std::string::npos && word.find('/') > equals;
+  // Behind a slash or a comma the sign belongs to the path or to an option: /dev/serial/by-id/a=b
+  // and /dev/ttyS1,flow=none are bare.
+  const bool isNamed = equals != std::string::npos && word.find_first_of("/,") > equals;
+  PortOptions port;
   if (!isNamed) {
-    if (word.empty()) {
-      *error = "a port needs a path";
-    } else if (!barePath_.empty()) {
-      *error = "only one port can be given without a name";
-    } else {
-      barePath_ = word;
-      return true;
+    if (!ParsePortOptions(word, &port, error)) {
+      return false;
     }
-    return false;
+    if (!barePort_.path.empty()) {
+      *error = "only one port can be given without a name";
+      return false;
+    }
+    barePort_ = port;
+    return true;
   }
   const std::string name = word.substr(0, equals);
-  const std::string path = word.substr(equals + 1);
+  const std::string rest = word.substr(equals + 1);
   if (!IsPortName(name)) {
     *error = "'" + name + "' is no port name; com1 to com16 are";
-  } else if (path.empty()) {
+  } else if (rest.empty() || rest[0] == ',') {
     *error = "a path is missing behind '" + name + "='";
-  } else if (!paths_.emplace(name, path).second) {
+  } else if (!ParsePortOptions(rest, &port, error)) {
+    return false;
+  } else if (!ports_.emplace(name, port).second) {
     *error = name + " is given twice";
   } else {
     return true;
@@ -45,7 +49,11 @@ bool PortMap::Add(const std::string& word, std::string* error) {
   return false;
 }
 
+PortOptions PortMap::OptionsFor(const std::string& portName) const {
+  const auto found = ports_.find(portName);
+  return found == ports_.end() ? barePort_ : found->second;
+}
+
 std::string PortMap::PathFor(const std::string& portName) const {
-  const auto found = paths_.find(portName);
-  return found == paths_.end() ? barePath_ : found->second;
+  return OptionsFor(portName).path;
 }

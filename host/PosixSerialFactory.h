@@ -1,14 +1,18 @@
 // SPDX-License-Identifier: Apache-2.0
 #pragma once
 
+#include <map>
 #include <memory>
 #include <mutex>
+#include <set>
 #include <string>
 #include <vector>
 
 #include "host/PortMap.h"
 #include "host/PortObserver.h"
 #include "host/PortProblem.h"
+#include "host/port/PortCounters.h"
+#include "host/port/TerminalCalls.h"
 #include "interfaces/ISerialFactory.h"
 
 class PosixSerialPort;
@@ -16,8 +20,9 @@ class PosixSerialPort;
 // Opens the ports of a port map. Owns every port until it is released. Any thread.
 class PosixSerialFactory final : public ISerialFactory {
  public:
-  // The observer may be null; otherwise it must outlive the factory.
-  PosixSerialFactory(PortMap ports, PortObserver* observer);
+  // The observer may be null; otherwise it must outlive the factory, and so must `calls`.
+  PosixSerialFactory(PortMap ports, PortObserver* observer,
+                     const TerminalCalls& calls = TerminalCalls::System());
   ~PosixSerialFactory() override;
 
   PosixSerialFactory(const PosixSerialFactory&) = delete;
@@ -28,8 +33,8 @@ class PosixSerialFactory final : public ISerialFactory {
   const char* GetImpName() const override { return "PosixSerialFactory"; }
   int GetImpVersion() const override { return 100; }
 
-  // Opens the path that the map gives for the name. Null when there is none or it cannot be opened;
-  // LastProblem then says why.
+  // Opens the path that the map gives for the name, with its options. Null when there is none or it
+  // cannot be opened; LastProblem then says why.
   ISerialPort* OpenPort(const char* name) override;
 
   // Closes a port; a call that is still waiting inside it is ended first. A pointer that is none of
@@ -43,6 +48,12 @@ class PosixSerialFactory final : public ISerialFactory {
   // did. Kind kNone when the last port opened was fine.
   PortProblem LastProblem() const;
 
+  // The counts of all ports that were opened under this name, together.
+  PortCounters CountersFor(const std::string& portName) const;
+
+  // Whether the port of this name is lost for good (reconnect=off).
+  bool IsGone(const std::string& portName) const;
+
   // Number of ports that were not released.
   std::size_t PortCount() const;
 
@@ -53,13 +64,17 @@ class PosixSerialFactory final : public ISerialFactory {
     std::string path;
   };
 
-  std::unique_ptr<PosixSerialPort> TryOpen(const std::string& name, const std::string& path,
+  std::unique_ptr<PosixSerialPort> TryOpen(const std::string& name, const PortOptions& options,
                                            PortProblem* problem) const;
+  void NoteStableName(const std::string& path);
 
   const PortMap ports_;
   PortObserver* const observer_;
+  const TerminalCalls& calls_;
 
   mutable std::mutex mutex_;
   std::vector<OpenPortEntry> open_;
+  std::map<std::string, PortCounters> releasedCounters_;
+  std::set<std::string> notedPaths_;
   PortProblem lastProblem_;
 };

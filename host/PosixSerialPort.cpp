@@ -1,47 +1,46 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "host/PosixSerialPort.h"
 
-#include <poll.h>
-#include <sys/eventfd.h>
-#include <unistd.h>
-
 #include <algorithm>
-#include <cerrno>
-#include <limits>
-#include <system_error>
 #include <utility>
 
+#include "host/PortList.h"
+#include "host/port/MonotonicTime.h"
 #include "interfaces/CompareInterface.h"
 
 namespace {
 
-constexpr int kSendBaseLimitMs = 1000;
 constexpr int kLeaveStepMs = 1;
+constexpr std::int64_t kNsPerMs = 1'000'000;
 
-int CreateCancelDescriptor() {
-  const int descriptor = eventfd(0, EFD_CLOEXEC | EFD_NONBLOCK);
-  if (descriptor < 0) {
-    throw std::system_error(errno, std::generic_category(), "eventfd");
-  }
-  return descriptor;
+// The by-id name where the device has one; the path as it was given where it has none.
+std::string ReturnPathFor(const std::string& path) {
+  const std::string stableName = StableNameOf(path);
+  return stableName.empty() ? path : stableName;
 }
 
 }  // namespace
 
-PosixSerialPort::PosixSerialPort(std::shared_ptr<SerialDevice> device, std::string path,
-                                 PortObserver* observer)
-    : path_(std::move(path)),
+PosixSerialPort::PosixSerialPort(std::shared_ptr<SerialDevice> device, PortOptions options,
+                                 PortObserver* observer, const TerminalCalls& calls)
+    : options_(std::move(options)),
+      returnPath_(ReturnPathFor(options_.path)),
       observer_(observer),
-      cancelDescriptor_(CreateCancelDescriptor()),
-      device_(device),
-      receiveDevice_(std::move(device)) {}
+      calls_(calls),
+      device_(std::move(device)) {
+  for (const std::string& note : device_->OpeningNotes()) {
+    Note(note);
+  }
+  thread_ = std::thread([this] { Serve(); });
+}
 
 PosixSerialPort::~PosixSerialPort() {
   Cancel();
   while (callsInside_.load() != 0) {
     Deadline::After(kLeaveStepMs).Sleep();
   }
-  (void)close(cancelDescriptor_);
+  thread_.join();
+  ReportServed();
 }
 
 void* PosixSerialPort::ConvertTo(const char* name) {
@@ -52,8 +51,8 @@ void* PosixSerialPort::ConvertTo(const char* name) {
 
 void PosixSerialPort::Cancel() {
   isCancelled_.store(true);
-  const std::uint64_t one = 1;
-  (void)!write(cancelDescriptor_, &one, sizeof one);
+  cancelled_.Raise();
+  queue_.Wake();
 }
 
 std::string PosixSerialPort::LastSetupError() const {
@@ -64,6 +63,35 @@ std::string PosixSerialPort::LastSetupError() const {
 std::shared_ptr<SerialDevice> PosixSerialPort::CurrentDevice() const {
   const std::lock_guard<std::mutex> lock(stateMutex_);
   return device_;
+}
+
+void PosixSerialPort::Note(const std::string& text) const {
+  if (observer_ != nullptr) {
+    observer_->OnPortNote(options_.path + ": " + text);
+  }
+}
+
+PortCounters PosixSerialPort::Counters() const {
+  PortCounters counters;
+  std::shared_ptr<SerialDevice> device;
+  {
+    const std::lock_guard<std::mutex> lock(stateMutex_);
+    counters = counters_;
+    device = device_;
+    if (device == nullptr) {
+      const std::int64_t lostNs = MonotonicNs() - lostSinceNs_;
+      counters.lostMs += static_cast<std::uint64_t>(lostNs / kNsPerMs);
+    }
+  }
+  if (device != nullptr) {
+    counters.lineErrors += device->Errors();
+  }
+  counters.receivedBytes = receivedBytes_.load();
+  counters.servedBytes = servedBytes_.load();
+  counters.lostBytes = lostBytes_.load();
+  counters.echoBytes = echoBytes_.load();
+  counters.echoMismatches = echoMismatches_.load();
+  return counters;
 }
 
 int PosixSerialPort::Setup(int baudrate, int parity, int dataBits, int stopBits, int mode) {
@@ -77,8 +105,10 @@ int PosixSerialPort::Setup(int baudrate, int parity, int dataBits, int stopBits,
     const std::lock_guard<std::mutex> lock(stateMutex_);
     if (device_ == nullptr) {
       why = WhyInvalid(settings);
-      why = why.empty() ? "the line is lost" : why;
-      settings_ = settings;
+      if (why.empty()) {
+        settings_ = settings;
+        why = "the line is lost";
+      }
     } else {
       isDone = device_->Apply(settings, &why, &note);
       if (isDone) {
@@ -87,180 +117,105 @@ int PosixSerialPort::Setup(int baudrate, int parity, int dataBits, int stopBits,
     }
     setupError_ = why;
   }
-  if (!note.empty() && observer_ != nullptr) {
-    observer_->OnPortNote(path_ + ": " + note);
+  if (!note.empty()) {
+    Note(note);
   }
   return isDone ? 1 : 0;
-}
-
-int PosixSerialPort::SendLimitMs(const SerialDevice& device, int lengthBytes) const {
-  LineSettings settings;
-  {
-    const std::lock_guard<std::mutex> lock(stateMutex_);
-    settings = settings_.value_or(LineSettings{});
-  }
-  const long long bytes = static_cast<long long>(lengthBytes) + device.PendingBytes();
-  const long long limit = kSendBaseLimitMs + 2 * LineTimeMs(settings, bytes);
-  return static_cast<int>(std::min<long long>(limit, std::numeric_limits<int>::max()));
-}
-
-int PosixSerialPort::Send(const unsigned char* data, int lengthBytes, int timeoutMs) {
-  if (data == nullptr || lengthBytes <= 0) {
-    return 0;
-  }
-  const CallGuard guard(&callsInside_);
-  const std::lock_guard<std::mutex> lock(sendMutex_);
-  const std::shared_ptr<SerialDevice> device = CurrentDevice();
-  if (device == nullptr) {
-    return 0;
-  }
-  const int limitMs = timeoutMs > 0 ? timeoutMs : SendLimitMs(*device, lengthBytes);
-  return SendAll(*device, data, lengthBytes, Deadline::After(limitMs));
-}
-
-int PosixSerialPort::SendAll(const SerialDevice& device, const unsigned char* data, int lengthBytes,
-                             const Deadline& deadline) const {
-  int sent = 0;
-  while (sent < lengthBytes && !isCancelled_.load()) {
-    const ssize_t written =
-        write(device.FileDescriptor(), data + sent, static_cast<std::size_t>(lengthBytes - sent));
-    if (written > 0) {
-      sent += static_cast<int>(written);
-    } else if (written < 0 && errno == EINTR) {
-      continue;
-    } else if (written == 0 || errno == EAGAIN) {
-      std::array<pollfd, 2> waits = {
-          {{device.FileDescriptor(), POLLOUT, 0}, {cancelDescriptor_, POLLIN, 0}}};
-      if (deadline.HasPassed() || deadline.Poll(waits.data(), waits.size()) <= 0 ||
-          (waits[0].revents & (POLLHUP | POLLERR | POLLNVAL)) != 0) {
-        break;
-      }
-    } else {
-      break;
-    }
-  }
-  return sent;
 }
 
 int PosixSerialPort::Receive(unsigned char* byte, int timeoutMs, int /*reserved*/) {
   if (byte == nullptr) {
     return 0;
   }
-  if (next_ == end_) {
+  if (next_ == block_.bytes.size()) {
     const CallGuard guard(&callsInside_);
+    ReportServed();
     if (observer_ != nullptr) {
       observer_->OnReceivePause(progress_);
     }
-    if (!WaitAndFill(Deadline::After(std::max(timeoutMs, 1)))) {
-      ++progress_.silences;
-      return 0;
+    if (!AwaitBlock(std::max(timeoutMs, 1) * kNsPerMs)) {
+      return AnswerSilence(timeoutMs);
     }
   }
-  *byte = buffer_[next_++];
+  *byte = static_cast<unsigned char>(block_.bytes[next_++]);
   return 1;
 }
 
-bool PosixSerialPort::WaitAndFill(const Deadline& deadline) {
-  // The deadline is looked at only after a read: on a busy machine the byte may be there in time
-  // while this thread is not.
+int PosixSerialPort::AnswerSilence(int timeoutMs) {
+  ++progress_.silences;
+  if (observer_ != nullptr) {
+    observer_->OnSilence(std::max(timeoutMs, 1));
+  }
+  return 0;
+}
+
+// False when "time-out" is the answer.
+bool PosixSerialPort::AwaitBlock(std::int64_t timeoutNs) {
+  const std::int64_t callNs = MonotonicNs();
+  bool hasLooked = false;
   while (!isCancelled_.load()) {
-    if (receiveDevice_ == nullptr) {
-      WaitForReturn(deadline);
-    }
-    if (receiveDevice_ != nullptr && ReadBlock(deadline)) {
+    bool isLate = false;
+    if (TakeBlock(timeoutNs, &isLate)) {
       return true;
     }
-    if (deadline.HasPassed()) {
+    std::int64_t deadlineNs = clock_.DeadlineNs(callNs, timeoutNs);
+    if (isLost_.load()) {
+      // Nobody can know what the line does now, and a caller in a loop must not spin.
+      deadlineNs = std::max(deadlineNs, callNs + timeoutNs);
+    }
+    if (isLate || hasLooked) {
+      clock_.TimedOut(deadlineNs);
       return false;
     }
+    if (MonotonicNs() < deadlineNs) {
+      (void)queue_.WaitUntil(deadlineNs);
+      continue;
+    }
+    // The port's own thread may be kept from its work by others; only the line itself can tell.
+    LookAtLine({deadlineNs, timeoutNs});
+    hasLooked = !isLost_.load() || MonotonicNs() >= callNs + timeoutNs;
   }
   return false;
 }
 
-// One attempt to read, then at most one wait. True when the buffer holds something.
-bool PosixSerialPort::ReadBlock(const Deadline& deadline) {
-  const ssize_t count = read(receiveDevice_->FileDescriptor(), buffer_.data(), buffer_.size());
-  if (count > 0) {
-    next_ = 0;
-    end_ = static_cast<std::size_t>(count);
-    progress_.receivedBytes += end_;
-    return true;
-  }
-  if (count == 0) {
-    Lose("the other end hung up");
-  } else if (errno == EAGAIN) {
-    if (!WaitReadable(deadline)) {
-      Lose(std::generic_category().message(errno));
-    }
-  } else if (errno != EINTR) {
-    Lose(std::generic_category().message(errno));
-  }
-  return false;
-}
-
-// False when waiting itself fails, with errno.
-bool PosixSerialPort::WaitReadable(const Deadline& deadline) {
-  std::array<pollfd, 2> waits = {
-      {{receiveDevice_->FileDescriptor(), POLLIN, 0}, {cancelDescriptor_, POLLIN, 0}}};
-  return deadline.Poll(waits.data(), waits.size()) >= 0;
-}
-
-void PosixSerialPort::Lose(const std::string& why) {
-  receiveDevice_->MarkLost();
-  {
-    const std::lock_guard<std::mutex> lock(stateMutex_);
-    device_.reset();
-  }
-  // The file must be closed soon: a plugged adapter gets its old name only when nobody holds it.
-  receiveDevice_.reset();
-  nextReturn_ = Deadline::After(kReturnIntervalMs);
-  returnProblem_ = PortProblem::Kind::kAbsent;
-  if (observer_ != nullptr) {
-    observer_->OnLineLost(path_, why);
-  }
-}
-
-void PosixSerialPort::WaitForReturn(const Deadline& deadline) {
-  if (nextReturn_.HasPassed()) {
-    nextReturn_ = Deadline::After(kReturnIntervalMs);
-    if (TryReturn()) {
-      return;
-    }
-  }
-  pollfd wait = {cancelDescriptor_, POLLIN, 0};
-  (void)Deadline::Earlier(deadline, nextReturn_).Poll(&wait, 1);
-}
-
-bool PosixSerialPort::TryReturn() {
-  // The number of a pseudo-terminal is used again, maybe for somebody's login: never take that.
-  if (IsControllingTerminal(path_)) {
+// True with the next block in place. Otherwise there is none, or it came too late to be given now.
+bool PosixSerialPort::TakeBlock(std::int64_t timeoutNs, bool* isLate) {
+  std::int64_t arrivedNs = 0;
+  if (!queue_.Peek(&arrivedNs)) {
     return false;
   }
-  PortProblem problem;
-  std::shared_ptr<SerialDevice> device = SerialDevice::Open(path_, &problem);
-  if (device == nullptr) {
-    if (problem.kind != returnProblem_ && observer_ != nullptr) {
-      observer_->OnPortNote(path_ + ": " + problem.text);
-    }
-    returnProblem_ = problem.kind;
+  if (!clock_.IsInTime(arrivedNs, timeoutNs)) {
+    *isLate = true;
     return false;
   }
-  std::string why;
-  std::string note;
-  {
-    const std::lock_guard<std::mutex> lock(stateMutex_);
-    if (settings_.has_value()) {
-      (void)device->Apply(*settings_, &why, &note);
-      setupError_ = why;
-    }
-    device_ = device;
+  bool hasRoomAgain = false;
+  (void)queue_.Take(&block_, &hasRoomAgain);
+  if (hasRoomAgain) {
+    hasRoom_.Raise();
   }
-  receiveDevice_ = std::move(device);
-  if (observer_ != nullptr) {
-    observer_->OnLineBack(path_);
-    if (!why.empty()) {
-      observer_->OnPortNote(path_ + ": " + why);
-    }
-  }
+  next_ = 0;
+  clock_.Gave(arrivedNs);
+  progress_.receivedBytes += block_.bytes.size();
+  servedBytes_.fetch_add(block_.bytes.size());
   return true;
+}
+
+void PosixSerialPort::LookAtLine(const Waited& waited) {
+  const std::shared_ptr<SerialDevice> device = CurrentDevice();
+  if (device != nullptr && !queue_.IsFull()) {
+    // An end or an error is left to the port's own thread, which sees it as well.
+    (void)ReadLine(*device, &waited);
+  }
+}
+
+void PosixSerialPort::ReportServed() {
+  if (next_ == 0) {
+    return;
+  }
+  if (observer_ != nullptr) {
+    observer_->OnServed(std::string_view(block_.bytes).substr(0, next_), block_.arrivedNs,
+                        block_.arrivedNs);
+  }
+  block_ = ArrivedBlock{};
+  next_ = 0;
 }

@@ -8,6 +8,7 @@
 
 #include "host/Deadline.h"
 #include "host/PortObserver.h"
+#include "host/port/ErrorName.h"
 
 // Remembers what a port tells and lets a test wait for it.
 class CountingObserver final : public PortObserver {
@@ -18,8 +19,8 @@ class CountingObserver final : public PortObserver {
     ++pauses_;
     changed_.notify_all();
   }
-  void OnLineLost(const std::string& path, const std::string& why) override {
-    OnPortNote("lost " + path + ": " + why);
+  void OnLineLost(const std::string& path, const std::string& why, int errorNumber) override {
+    OnPortNote("lost " + path + ": " + why + " " + ErrorName(errorNumber));
   }
   void OnLineBack(const std::string& path) override { OnPortNote("back " + path); }
   void OnPortNote(const std::string& text) override {
@@ -39,6 +40,12 @@ class CountingObserver final : public PortObserver {
   std::vector<std::string> Notes() const {
     const std::lock_guard<std::mutex> lock(mutex_);
     return notes_;
+  }
+  // Waits until so many notes have come, lost and back included.
+  bool AwaitNotes(std::size_t count, int limitMs) {
+    std::unique_lock<std::mutex> lock(mutex_);
+    return changed_.wait_for(lock, Deadline::After(limitMs).Remaining(),
+                             [&] { return notes_.size() >= count; });
   }
   // Waits until a further pause begins.
   bool AwaitPause(int limitMs) {

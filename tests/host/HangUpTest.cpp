@@ -43,9 +43,9 @@ class ReplaceableLine {
 
 std::unique_ptr<PosixSerialPort> OpenPort(const std::string& path, PortObserver* observer) {
   PortProblem problem;
-  std::shared_ptr<SerialDevice> device = SerialDevice::Open(path, &problem);
+  std::shared_ptr<SerialDevice> device = SerialDevice::Open(PortOptions::For(path), &problem);
   EXPECT_NE(device, nullptr) << problem.text;
-  return std::make_unique<PosixSerialPort>(device, path, observer);
+  return std::make_unique<PosixSerialPort>(device, PortOptions::For(path), observer);
 }
 
 // Processor time of a process in milliseconds.
@@ -66,8 +66,10 @@ long ProcessorMs(int processId) {
 
 TEST(HangUp, ReceiveWaitsItsTimeOutsOut) {
   auto line = std::make_unique<PseudoTerminal>();
-  const auto port = OpenPort(line->Path(), nullptr);
+  CountingObserver observer;
+  const auto port = OpenPort(line->Path(), &observer);
   line.reset();
+  ASSERT_TRUE(observer.AwaitNotes(1, kLimitMs));
   // Not early is what counts; late is the machine's business.
   for (int round = 0; round < 3; ++round) {
     const auto begin = std::chrono::steady_clock::now();
@@ -83,8 +85,8 @@ TEST(HangUp, LineThatComesBackIsOpenedAgainWithItsSettings) {
   const auto port = OpenPort(line.Path(), &observer);
   ASSERT_EQ(port->Setup(9600, 1, 8, 1, 0), 1);
   line.Disconnect();
+  ASSERT_TRUE(observer.AwaitNotes(1, kLimitMs));
   unsigned char byte = 0;
-  ASSERT_EQ(port->Receive(&byte, 1, 0), 0);
   // Set while the line is away, in effect once it is back.
   EXPECT_EQ(port->Setup(19200, 0, 8, 1, 0), 0);
   line.Connect();
@@ -104,8 +106,8 @@ TEST(HangUp, SomebodysTerminalIsNotTakenForTheLine) {
   CountingObserver observer;
   const auto port = OpenPort(line.Path(), &observer);
   line.Disconnect();
+  ASSERT_TRUE(observer.AwaitNotes(1, kLimitMs));
   unsigned char byte = 0;
-  ASSERT_EQ(port->Receive(&byte, 1, 0), 0);
   line.Connect();
   {
     const SessionProcess login(line.Path());

@@ -1,6 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #include <gtest/gtest.h>
 
+#include <cerrno>
 #include <csignal>
 #include <thread>
 #include <vector>
@@ -61,13 +62,15 @@ TEST(HostEvents, WaitsForSilences) {
 TEST(HostEvents, PassesNotesOn) {
   std::vector<std::string> notes;
   HostEvents events([&](const std::string& text) { notes.push_back(text); });
-  events.OnLineLost("/dev/x", "gone");
+  events.OnLineLost("/dev/x", "gone", EIO);
+  events.OnLineGone("/dev/x", "gone", 0);
   events.OnLineBack("/dev/x");
   events.OnPortNote("note");
-  ASSERT_EQ(notes.size(), 3U);
-  EXPECT_EQ(notes[0], "/dev/x: line lost (gone); waiting for it to come back");
-  EXPECT_EQ(notes[1], "/dev/x: line is back, opened again with the same settings");
-  EXPECT_EQ(notes[2], "note");
+  ASSERT_EQ(notes.size(), 4U);
+  EXPECT_EQ(notes[0], "/dev/x: line lost (gone, EIO); waiting for it to come back");
+  EXPECT_EQ(notes[1], "/dev/x: line lost (gone); not opened again (reconnect=off)");
+  EXPECT_EQ(notes[2], "/dev/x: line is back, opened again with the same settings");
+  EXPECT_EQ(notes[3], "note");
 }
 
 }  // namespace

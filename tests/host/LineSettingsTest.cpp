@@ -9,6 +9,7 @@
 #include "host/LineSettings.h"
 #include "host/LinuxRs485.h"
 #include "host/PseudoTerminal.h"
+#include "host/port/TerminalCalls.h"
 #include "interfaces/ISerialPort.h"
 
 namespace {
@@ -139,10 +140,13 @@ TEST(LinuxRs485, IsOffForTheOtherModes) {
 
 TEST(LinuxRs485, TellsWhenADeviceHasNoSuchControl) {
   const PseudoTerminal line;
-  EXPECT_EQ(ApplyRs485(line.FileDescriptor(), kModeRs232), Rs485Outcome::kDone);
-  EXPECT_EQ(ApplyRs485(line.FileDescriptor(), kModeRs422), Rs485Outcome::kDone);
-  EXPECT_EQ(ApplyRs485(line.FileDescriptor(), kModeRs485), Rs485Outcome::kNotSupported);
-  EXPECT_EQ(ApplyRs485(-1, kModeRs485), Rs485Outcome::kFailed);
+  EXPECT_EQ(ApplyRs485(TerminalCalls::System(), line.FileDescriptor(), kModeRs232),
+            Rs485Outcome::kDone);
+  EXPECT_EQ(ApplyRs485(TerminalCalls::System(), line.FileDescriptor(), kModeRs422),
+            Rs485Outcome::kDone);
+  EXPECT_EQ(ApplyRs485(TerminalCalls::System(), line.FileDescriptor(), kModeRs485),
+            Rs485Outcome::kNotSupported);
+  EXPECT_EQ(ApplyRs485(TerminalCalls::System(), -1, kModeRs485), Rs485Outcome::kFailed);
 }
 
 }  // namespace

@@ -19,9 +19,9 @@ constexpr int kLimitMs = 20000;
 
 std::unique_ptr<PosixSerialPort> OpenPort(const std::string& path, PortObserver* observer) {
   PortProblem problem;
-  std::shared_ptr<SerialDevice> device = SerialDevice::Open(path, &problem);
+  std::shared_ptr<SerialDevice> device = SerialDevice::Open(PortOptions::For(path), &problem);
   EXPECT_NE(device, nullptr) << problem.text;
-  return std::make_unique<PosixSerialPort>(device, path, observer);
+  return std::make_unique<PosixSerialPort>(device, PortOptions::For(path), observer);
 }
 
 class PosixSerialPortTest : public testing::Test {
@@ -271,12 +271,13 @@ TEST(PosixSerialPortHangUp, IsToldOnceAndSendsAreRefused) {
   unsigned char byte = 0;
   ASSERT_EQ(port->Receive(&byte, kLimitMs, 0), 1);
   line.reset();
+  ASSERT_TRUE(observer.AwaitNotes(1, kLimitMs));
   // What was received before still comes.
   EXPECT_EQ(port->Receive(&byte, 1, 0), 1);
   EXPECT_EQ(byte, 'b');
   EXPECT_EQ(port->Receive(&byte, 1, 0), 0);
   EXPECT_EQ(port->Receive(&byte, 1, 0), 0);
-  EXPECT_EQ(observer.Notes(), std::vector<std::string>{"lost " + path + ": the other end hung up"});
+  EXPECT_EQ(observer.Notes(), std::vector<std::string>{"lost " + path + ": the other end hung up EIO"});
   EXPECT_EQ(port->Send(&byte, 1, 0), 0);
   EXPECT_EQ(port->Setup(19200, 0, 8, 1, 0), 0);
   EXPECT_EQ(port->LastSetupError(), "the line is lost");

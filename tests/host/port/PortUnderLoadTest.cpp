@@ -1,0 +1,119 @@
+// SPDX-License-Identifier: Apache-2.0
+#include <gtest/gtest.h>
+#include <sys/wait.h>
+#include <unistd.h>
+
+#include <csignal>
+#include <cstdio>
+#include <cstdlib>
+#include <memory>
+#include <string>
+#include <thread>
+#include <vector>
+
+#include "host/Deadline.h"
+#include "host/HostEvents.h"
+#include "host/HostSession.h"
+#include "host/PseudoTerminal.h"
+#include "host/TokenReader.h"
+#include "host/port/MonotonicTime.h"
+#include "tests/host/PluginConfiguration.h"
+#include "tests/support/PluginLibrary.h"
+
+namespace {
+
+constexpr int kLimitMs = 20000;
+constexpr int kGapMs = 10;
+// Between two tokens. A third of it is the gap, so a stamp may be 20 ms late before two are joined.
+constexpr int kPauseMs = 30;
+constexpr long kDefaultTokens = 2000;
+
+long TokenCount() {
+  const char* const text = std::getenv("LOKA_GAP_TOKENS");
+  return text == nullptr ? kDefaultTokens : std::strtol(text, nullptr, 10);
+}
+
+// Processes that keep every processor busy. Made before the test has threads.
+class BusyProcessors {
+ public:
+  BusyProcessors() {
+    const long count = sysconf(_SC_NPROCESSORS_ONLN);
+    for (long i = 0; i < count; ++i) {
+      const pid_t processId = fork();
+      if (processId == 0) {
+        for (;;) {
+          // A call that the compiler cannot leave out, and that costs time in user space only.
+          (void)MonotonicNs();
+        }
+      }
+      processIds_.push_back(processId);
+    }
+  }
+  ~BusyProcessors() {
+    for (const pid_t processId : processIds_) {
+      kill(processId, SIGKILL);
+      waitpid(processId, nullptr, 0);
+    }
+  }
+  BusyProcessors(const BusyProcessors&) = delete;
+  BusyProcessors& operator=(const BusyProcessors&) = delete;
+
+ private:
+  std::vector<pid_t> processIds_;
+};
+
+// 1 to 24 bytes that differ from token to token.
+std::string TokenText(long number) {
+  char text[32] = {};
+  std::snprintf(text, sizeof text, "%ld-abcdefghijklmnop", number);
+  return std::string(text).substr(0, 8 + static_cast<std::size_t>(number % 12));
+}
+
+// Each token is handed to the line in one piece; a sender that is kept waiting only makes a silence
+// longer.
+void SendTokens(const PseudoTerminal& line, long count) {
+  for (long number = 0; number < count; ++number) {
+    Deadline::After(kPauseMs).Sleep();
+    if (!line.Send(TokenText(number), Deadline::After(kLimitMs))) {
+      ADD_FAILURE() << "the device cannot send";
+      return;
+    }
+  }
+}
+
+TEST(PortUnderLoad, SilenceCutsEveryTokenWhileAllProcessorsAreBusy) {
+  const BusyProcessors load;
+  const long count = TokenCount();
+  PseudoTerminal line;
+  HostEvents events(nullptr);
+  HostOptions options;
+  options.pluginFile = PluginLibrary::DefaultPath();
+  options.observer = &events;
+  std::string error;
+  ASSERT_TRUE(options.ports.Add(line.Path(), &error));
+  HostSession session(options);
+  ASSERT_TRUE(session.Open().IsDone());
+  ASSERT_TRUE(
+      session.Configure(TestConfiguration("token_queue_size=10000 gap=" + std::to_string(kGapMs)))
+          .IsDone());
+  ASSERT_TRUE(session.Start().IsDone());
+  SendTokens(line, count);
+  ASSERT_TRUE(events.WaitForSilences(3, Deadline::After(kLimitMs)));
+  TokenReader reader(&session);
+  ReceivedToken token;
+  long taken = 0;
+  long wrong = 0;
+  std::string firstWrong;
+  while (reader.Take(&token) == TokenReader::Outcome::kToken) {
+    if (token.bytes != TokenText(taken)) {
+      ++wrong;
+      firstWrong = firstWrong.empty() ? std::to_string(taken) + ": " + token.bytes : firstWrong;
+    }
+    ++taken;
+  }
+  RecordProperty("tokens", static_cast<int>(taken));
+  EXPECT_EQ(taken, count);
+  EXPECT_EQ(wrong, 0) << firstWrong;
+}
+
+}  // namespace
