@@ -1,6 +1,9 @@
 // SPDX-License-Identifier: Apache-2.0
 #pragma once
 
+#include <gtest/gtest.h>
+
+#include <algorithm>
 #include <condition_variable>
 #include <mutex>
 #include <string>
@@ -29,6 +32,22 @@ class CountingObserver final : public PortObserver {
     changed_.notify_all();
   }
 
+  void OnServed(std::string_view bytes, std::int64_t firstArrivalNs,
+                std::int64_t lastArrivalNs) override {
+    EXPECT_GT(firstArrivalNs, 0);
+    EXPECT_LE(firstArrivalNs, lastArrivalNs);
+    Tell(std::string(bytes));
+  }
+  void OnSilence(int timeoutMs) override { Tell("." + std::to_string(timeoutMs)); }
+  void OnSent(std::string_view bytes, std::size_t takenBytes) override {
+    Tell(">" + std::string(bytes) + "(" + std::to_string(takenBytes) + ")");
+  }
+
+  // Bytes served, ".T" for a silence of T ms, ">bytes(taken)" for a send; the last 200 characters.
+  std::string Story() const {
+    const std::lock_guard<std::mutex> lock(mutex_);
+    return story_;
+  }
   int Pauses() const {
     const std::lock_guard<std::mutex> lock(mutex_);
     return pauses_;
@@ -62,9 +81,17 @@ class CountingObserver final : public PortObserver {
   }
 
  private:
+  void Tell(const std::string& text) {
+    constexpr std::size_t kMostCharacters = 200;
+    const std::lock_guard<std::mutex> lock(mutex_);
+    story_ += text;
+    story_.erase(0, story_.size() - std::min(story_.size(), kMostCharacters));
+  }
+
   mutable std::mutex mutex_;
   std::condition_variable changed_;
   int pauses_ = 0;
   ReceiveProgress progress_;
   std::vector<std::string> notes_;
+  std::string story_;
 };

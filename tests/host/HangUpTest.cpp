@@ -118,6 +118,50 @@ TEST(HangUp, SomebodysTerminalIsNotTakenForTheLine) {
   }
 }
 
+TEST(HangUp, SendsWhileTheLineIsLostAreCounted) {
+  CountingObserver observer;
+  ReplaceableLine line;
+  const auto port = OpenPort(line.Path(), &observer);
+  line.Disconnect();
+  ASSERT_TRUE(observer.AwaitNotes(1, kLimitMs));
+  const unsigned char bytes[3] = {1, 2, 3};
+  EXPECT_EQ(port->Send(bytes, 3, 0), 0);
+  EXPECT_EQ(port->Send(bytes, 2, 0), 0);
+  EXPECT_TRUE(port->IsLost());
+  EXPECT_FALSE(port->IsGone());
+  line.Connect();
+  ASSERT_TRUE(observer.AwaitNotes(2, kLimitMs));
+  EXPECT_EQ(port->Send(bytes, 1, 0), 1);
+  const PortCounters counters = port->Counters();
+  EXPECT_EQ(counters.sends, 3U);
+  EXPECT_EQ(counters.sentBytes, 1U);
+  EXPECT_EQ(counters.lostSends, 2U);
+  EXPECT_EQ(counters.lostSendBytes, 5U);
+  EXPECT_EQ(counters.losses, 1U);
+  EXPECT_EQ(counters.reconnects, 1U);
+  // The port looks for its line every half second, the first time half a second after the loss.
+  EXPECT_GE(counters.lostMs, 500U);
+}
+
+TEST(HangUp, LossIsFinalWithoutReconnect) {
+  CountingObserver observer;
+  ReplaceableLine line;
+  PortOptions options = PortOptions::For(line.Path());
+  options.reconnects = false;
+  PortProblem problem;
+  PosixSerialPort port(SerialDevice::Open(options, &problem), options, &observer);
+  line.Disconnect();
+  ASSERT_TRUE(observer.AwaitNotes(1, kLimitMs));
+  line.Connect();
+  ASSERT_TRUE(line->Send("z", Deadline::After(kLimitMs)));
+  unsigned char byte = 0;
+  // Three times the interval at which a port looks for its line.
+  EXPECT_EQ(port.Receive(&byte, 1500, 0), 0);
+  EXPECT_TRUE(port.IsGone());
+  EXPECT_EQ(observer.Notes().size(), 1U);
+  EXPECT_EQ(port.Counters().reconnects, 0U);
+}
+
 // Two seconds of measuring; 2 % of them are 40 ms.
 TEST(HangUp, WatchDoesNotSpinAndGoesOnWhenTheLineIsBack) {
   constexpr int kMeasureMs = 2000;

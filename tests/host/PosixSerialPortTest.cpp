@@ -261,6 +261,36 @@ TEST_F(PosixSerialPortTest, MarksTheDeviceAsItsOwnAndTakesTheMarkAway) {
   }
 }
 
+// The driver is away: the port keeps a bounded part and leaves the rest to the sender's side.
+TEST_F(PosixSerialPortTest, KeepsABoundedPartForADriverThatIsAway) {
+  const std::string bytes(3 * PosixSerialPort::kKeptBytes, 'x');
+  std::thread device([&] { DeviceSends(bytes); });
+  // Nothing is lost: once the driver reads, the device gets rid of everything.
+  std::uint64_t before = 0;
+  while (port_->Counters().receivedBytes == 0 || port_->Counters().receivedBytes != before) {
+    before = port_->Counters().receivedBytes;
+    Deadline::After(50).Sleep();
+  }
+  EXPECT_LE(before, PosixSerialPort::kKeptBytes + 4096);
+  EXPECT_EQ(Receive(bytes.size()).size(), bytes.size());
+  device.join();
+}
+
+TEST_F(PosixSerialPortTest, TellsServedBytesAndSilencesInOrder) {
+  DeviceSends("ab");
+  EXPECT_EQ(Receive(1), "a");
+  EXPECT_EQ(observer_.Story(), "");
+  EXPECT_EQ(Receive(1), "b");
+  unsigned char byte = 0;
+  EXPECT_EQ(port_->Receive(&byte, 7, 0), 0);
+  DeviceSends("c");
+  EXPECT_EQ(Receive(1), "c");
+  EXPECT_EQ(observer_.Story(), "ab.7");
+  EXPECT_EQ(Send("xy", 0), 2);
+  port_.reset();
+  EXPECT_EQ(observer_.Story(), "ab.7>xy(2)c");
+}
+
 TEST(PosixSerialPortHangUp, IsToldOnceAndSendsAreRefused) {
   CountingObserver observer;
   auto line = std::make_unique<PseudoTerminal>();
@@ -277,7 +307,8 @@ TEST(PosixSerialPortHangUp, IsToldOnceAndSendsAreRefused) {
   EXPECT_EQ(byte, 'b');
   EXPECT_EQ(port->Receive(&byte, 1, 0), 0);
   EXPECT_EQ(port->Receive(&byte, 1, 0), 0);
-  EXPECT_EQ(observer.Notes(), std::vector<std::string>{"lost " + path + ": the other end hung up EIO"});
+  EXPECT_EQ(observer.Notes(),
+            std::vector<std::string>{"lost " + path + ": the other end hung up EIO"});
   EXPECT_EQ(port->Send(&byte, 1, 0), 0);
   EXPECT_EQ(port->Setup(19200, 0, 8, 1, 0), 0);
   EXPECT_EQ(port->LastSetupError(), "the line is lost");
