@@ -2,13 +2,17 @@
 #include "host/CommandLine.h"
 
 #include <CLI/CLI.hpp>
+#include <algorithm>
 #include <cstdio>
 #include <exception>
 #include <string>
+#include <vector>
 
+#include "host/CmdCommand.h"
 #include "host/DemoCommand.h"
 #include "host/DemoDevice.h"
 #include "host/DemoSteps.h"
+#include "host/DescribeCommand.h"
 #include "host/ExitStatus.h"
 #include "host/WatchCommand.h"
 #include "host/commands/ConfigCommand.h"
@@ -23,9 +27,12 @@ constexpr const char* kExitText =
 
 // Everything that the commands take from the command line.
 struct Arguments {
+  InstanceOptions watch;
+  CmdOptions cmd;
+  std::string cmdPort;
+  DescribeOptions describe;
   ExplainOptions explain;
   ConfigOptions config;
-  WatchOptions watch;
   std::string demoPlugin;
   std::string restartedPlugin;
   std::string restartedPort;
@@ -37,28 +44,113 @@ void AddPlugin(CLI::App* command, std::string* file) {
       ->type_name("FILE");
 }
 
-void AddWatch(CLI::App* app, Arguments* arguments) {
-  CLI::App* const watch = app->add_subcommand("watch", "Print each token that a device sends");
-  WatchOptions& options = arguments->watch;
-  watch
-      ->add_option("--port", options.portWords,
+// The options of a command that runs a protocol instance.
+void AddInstance(CLI::App* command, InstanceOptions* options, bool isRequired) {
+  command
+      ->add_option("--port", options->portWords,
                    "Port to open: a path, or comN=PATH for one of several names")
       ->type_name("PORT")
-      ->required()
+      ->required(isRequired)
       ->expected(1)
       ->take_all();
-  watch->add_option("--config", options.configuration, "Configuration, \"CfgVer=1 model=1 ...\"")
+  command->add_option("--config", options->configuration, "Configuration, \"CfgVer=1 model=1 ...\"")
       ->type_name("TEXT")
-      ->required();
+      ->required(isRequired);
   CLI::Option* const store =
-      watch->add_option("--store", options.storeFile, "File with the stored settings")
+      command->add_option("--store", options->storeFile, "File with the stored settings")
           ->type_name("FILE");
-  watch->add_flag("--no-store", options.withoutStore, "Neither use nor keep stored settings")
+  command->add_flag("--no-store", options->withoutStore, "Neither use nor keep stored settings")
       ->excludes(store);
-  watch->add_option("--ident", options.ident, "Whose stored settings (else the port name)")
+  command->add_option("--ident", options->ident, "Whose stored settings (else the port name)")
       ->type_name("NAME");
-  AddPlugin(watch, &options.pluginFile);
-  watch->add_flag("-v,--verbose", options.isVerbose, "Say which files are used");
+  AddPlugin(command, &options->pluginFile);
+  command->add_flag("-v,--verbose", options->isVerbose, "Say which files are used");
+}
+
+void AddWatch(CLI::App* app, Arguments* arguments) {
+  CLI::App* const watch = app->add_subcommand("watch", "Print each token that a device sends");
+  AddInstance(watch, &arguments->watch, true);
+}
+
+void AddCmd(CLI::App* app, Arguments* arguments) {
+  CLI::App* const cmd = app->add_subcommand("cmd", "Run one console command of the driver");
+  cmd->add_option("PORT", arguments->cmdPort, "Port to open, as --port says it")->type_name("");
+  // For the help only: CutWords takes the words away before they are parsed.
+  cmd->add_option("WORD", arguments->cmd.words, "The command; its words end the options")
+      ->type_name("")
+      ->expected(-1);
+  AddInstance(cmd, &arguments->cmd.instance, false);
+  cmd->footer(std::string("Example: loka cmd /dev/ttyUSB0 --config \"$CONFIG\" put hello world\n"
+                          "         loka cmd help\n") +
+              kExitText);
+}
+
+// No command has a slash or a sign in its first word; a path and comN=PATH do.
+bool LooksLikePort(const std::string& word) {
+  const std::size_t mark = word.find_first_of(" /=");
+  return mark != std::string::npos && word[mark] != ' ';
+}
+
+// Removes the words of a console command from the arguments of "cmd" and returns them: they start
+// at the first argument that is no option, no option's value and no port, and end with the line, so
+// that a word may look like an option.
+std::vector<std::string> CutWords(const CLI::App& cmd, std::vector<std::string>* arguments) {
+  bool hasPort = false;
+  std::size_t at = 1;
+  for (; at < arguments->size(); ++at) {
+    const std::string& argument = (*arguments)[at];
+    if (argument == "--") {
+      break;
+    }
+    if (!argument.empty() && argument.front() == '-') {
+      const CLI::Option* const option = cmd.get_option_no_throw(argument);
+      if (option != nullptr && option->get_items_expected_max() > 0) {
+        ++at;
+      }
+    } else if (!hasPort && LooksLikePort(argument)) {
+      hasPort = true;
+    } else {
+      break;
+    }
+  }
+  const auto first =
+      arguments->begin() + static_cast<std::ptrdiff_t>(std::min(at, arguments->size()));
+  std::vector<std::string> words(first, arguments->end());
+  arguments->erase(first, arguments->end());
+  if (!words.empty() && words.front() == "--") {
+    words.erase(words.begin());
+  }
+  return words;
+}
+
+void Parse(CLI::App* app, std::vector<std::string> words, Arguments* values) {
+  std::vector<std::string> commandWords;
+  if (!words.empty() && words.front() == "cmd") {
+    commandWords = CutWords(*app->get_subcommand("cmd"), &words);
+  }
+  // CLI11 takes a vector from its back.
+  std::reverse(words.begin(), words.end());
+  app->parse(words);
+  values->cmd.words = std::move(commandWords);
+  if (!values->cmdPort.empty()) {
+    values->cmd.instance.portWords.push_back(values->cmdPort);
+  }
+}
+
+void AddDescribe(CLI::App* app, Arguments* arguments) {
+  CLI::App* const describe = app->add_subcommand(
+      "describe", "Print what a driver says about its configuration and memory types");
+  DescribeOptions& options = arguments->describe;
+  CLI::Option* const file = describe
+                                ->add_option("FILE", options.libraryFile,
+                                             "Library to search, of any machine; it is not loaded")
+                                ->type_name("");
+  describe->add_option("--plugin", options.pluginFile, "Driver to load instead")
+      ->type_name("FILE")
+      ->excludes(file);
+  CLI::Option* const xml =
+      describe->add_flag("--xml", options.asXml, "The document as it stands, XML in UTF-8");
+  describe->add_flag("--json", options.asJson, "The same as JSON")->excludes(xml);
 }
 
 void AddDemo(CLI::App* app, Arguments* arguments) {
@@ -76,6 +168,12 @@ void AddDemo(CLI::App* app, Arguments* arguments) {
 int Dispatch(const CLI::App& app, const Arguments& arguments) {
   if (app.got_subcommand("watch")) {
     return RunWatch(arguments.watch);
+  }
+  if (app.got_subcommand("cmd")) {
+    return RunCmd(arguments.cmd);
+  }
+  if (app.got_subcommand("describe")) {
+    return RunDescribe(arguments.describe);
   }
   if (app.got_subcommand("explain")) {
     return RunExplain(arguments.explain);
@@ -103,11 +201,13 @@ int RunCommandLine(int argumentCount, const char* const* arguments) {
     app.require_subcommand(0, 1);
     Arguments values;
     AddWatch(&app, &values);
+    AddCmd(&app, &values);
+    AddDescribe(&app, &values);
     AddExplain(&app, &values.explain);
     AddConfig(&app, &values.config);
     AddDemo(&app, &values);
     try {
-      app.parse(argumentCount, arguments);
+      Parse(&app, {arguments + std::min(argumentCount, 1), arguments + argumentCount}, &values);
     } catch (const CLI::ParseError& error) {
       return static_cast<int>(app.exit(error) == 0 ? ExitStatus::kDone : ExitStatus::kUsage);
     }

@@ -6,7 +6,7 @@ enum class ExitStatus : int {
   kDone = 0,
   kRefused = 1,        // the driver, a tag or the store refused; the text is on stderr
   kUsage = 2,          // the command line is not right
-  kPlugin = 3,         // the plug-in cannot be loaded or lacks an interface
+  kPlugin = 3,         // the plug-in cannot be loaded or lacks an interface or a description
   kConfiguration = 4,  // the driver rejects the configuration
   kPort = 5,           // the port cannot be opened or set up
   kFirstSignal = 128,

@@ -8,23 +8,17 @@
 #include <ctime>
 
 #include "host/ByteText.h"
-#include "host/ConfigText.h"
 #include "host/Deadline.h"
 #include "host/ExitStatus.h"
 #include "host/HostEvents.h"
 #include "host/HostSession.h"
-#include "host/PortAdvice.h"
-#include "host/SettingsReport.h"
+#include "host/Output.h"
 #include "host/SignalWatch.h"
-#include "host/StorePath.h"
 #include "host/TokenReader.h"
 
 namespace {
 
 constexpr int kServeRoundMs = 60 * 60 * 1000;
-
-// One call a line, so that lines of several threads do not mix.
-void Tell(const std::string& text) { (void)std::fprintf(stderr, "loka: %s\n", text.c_str()); }
 
 int Code(ExitStatus status) { return static_cast<int>(status); }
 
@@ -49,63 +43,36 @@ void PrintToken(const ReceivedToken& token) {
 
 class Watch {
  public:
-  explicit Watch(const WatchOptions& options)
+  explicit Watch(const InstanceOptions& options)
       : options_(options),
-        portName_(ConfigValue(options.configuration, "port", "")),
-        events_(Tell),
+        events_(TellUser),
         signals_([this](int signalNumber) { events_.RequestStop(signalNumber); }) {}
 
   int Run();
 
  private:
-  bool MakeHostOptions(HostOptions* host);
-  int Report(const HostResult& result) const;
   int Serve(HostSession* session);
   bool Connect(HostSession* session, HostResult* result);
-  void TellSettings(HostSession* session);
   bool PrintWaiting(TokenReader* reader, bool* isFailed);
 
-  const WatchOptions& options_;
-  const std::string portName_;
-  PortMap ports_;
+  const InstanceOptions& options_;
   HostEvents events_;
   SignalWatch signals_;
 };
 
-bool Watch::MakeHostOptions(HostOptions* host) {
-  for (const std::string& word : options_.portWords) {
-    std::string error;
-    if (!ports_.Add(word, &error)) {
-      Tell("--port " + word + ": " + error);
-      return false;
-    }
-  }
-  host->pluginFile = options_.pluginFile;
-  host->ports = ports_;
-  if (!options_.withoutStore) {
-    host->storeFile = options_.storeFile.empty() ? DefaultStorePath() : options_.storeFile;
-    if (host->storeFile.empty()) {
-      Tell("no home folder for the store; name one with --store FILE or use --no-store");
-      return false;
-    }
-  }
-  host->ident = options_.ident.empty() ? portName_ : options_.ident;
-  host->observer = &events_;
-  return true;
-}
-
 int Watch::Run() {
   HostOptions host;
-  if (!MakeHostOptions(&host)) {
+  std::string error;
+  if (!MakeHostOptions(options_, &host, &error)) {
+    TellUser(error);
     return Code(ExitStatus::kUsage);
   }
+  host.observer = &events_;
   HostSession session(host);
   HostResult result = session.Open();
   if (result.IsDone()) {
     if (options_.isVerbose) {
-      Tell("plug-in " + session.PluginPath());
-      Tell("store " + (host.storeFile.empty() ? "none" : host.storeFile) + ", identifier " +
-           host.ident);
+      TellFiles(session, host);
     }
     result = session.Configure(options_.configuration);
   }
@@ -113,24 +80,10 @@ int Watch::Run() {
     result = session.Start();
   }
   if (!result.IsDone() || !Connect(&session, &result)) {
-    return Report(result);
+    return TellFailure(options_, result);
   }
-  TellSettings(&session);
+  TellSettings(options_, host, &session);
   return Serve(&session);
-}
-
-int Watch::Report(const HostResult& result) const {
-  Tell(result.text);
-  if (result.status == ExitStatus::kPort) {
-    for (const std::string& line : AdviceFor(result.problem)) {
-      Tell(line);
-    }
-  } else if (result.status == ExitStatus::kConfiguration) {
-    Tell("the driver rejects the configuration: " + EscapeBytes(options_.configuration));
-  } else if (result.status == ExitStatus::kRefused && !options_.withoutStore) {
-    Tell("--no-store goes on without stored settings");
-  }
-  return Code(result.status);
 }
 
 // A configuration may leave the port closed at the start; a watch wants it open.
@@ -147,18 +100,6 @@ bool Watch::Connect(HostSession* session, HostResult* result) {
   return false;
 }
 
-void Watch::TellSettings(HostSession* session) {
-  for (const std::string& line : DescribeSettings(session, portName_, ports_.PathFor(portName_))) {
-    Tell(line);
-  }
-  if (session->Storage() != nullptr) {
-    const SqliteFile::Values stored = session->Storage()->All(session->Ident());
-    for (const std::string& line : DescribeOverrides(options_.configuration, stored)) {
-      Tell(line);
-    }
-  }
-}
-
 // Prints and acknowledges what waits. False once the driver refuses.
 bool Watch::PrintWaiting(TokenReader* reader, bool* isFailed) {
   ReceivedToken token;
@@ -171,9 +112,9 @@ bool Watch::PrintWaiting(TokenReader* reader, bool* isFailed) {
     }
     PrintToken(token);
     if (token.isCut) {
-      Tell("this token has " + std::to_string(token.lengthBytes) +
-           " bytes and a zero byte behind the first " + std::to_string(token.bytes.size()) +
-           "; the driver shows plain tokens up to there (hex_tokens=true shows all)");
+      TellUser("this token has " + std::to_string(token.lengthBytes) +
+               " bytes and a zero byte behind the first " + std::to_string(token.bytes.size()) +
+               "; the driver shows plain tokens up to there (hex_tokens=true shows all)");
     }
     if (!reader->Acknowledge()) {
       *isFailed = true;
@@ -191,7 +132,7 @@ int Watch::Serve(HostSession* session) {
     (void)events_.WaitUntil(hasFailed, Deadline::After(kServeRoundMs));
   }
   if (isFailed) {
-    Tell(reader.Error());
+    TellUser(reader.Error());
     return Code(ExitStatus::kRefused);
   }
   return Code(ExitStatus::kFirstSignal) + events_.StopSignal();
@@ -199,7 +140,7 @@ int Watch::Serve(HostSession* session) {
 
 }  // namespace
 
-int RunWatch(const WatchOptions& options) {
+int RunWatch(const InstanceOptions& options) {
   // A line at a time, so that pipes get each token as it comes.
   (void)std::setvbuf(stdout, nullptr, _IOLBF, BUFSIZ);
   Watch watch(options);

@@ -23,8 +23,11 @@ bool Holds(const std::string& text, const std::string& part) {
 }
 
 TEST(Program, HelpFitsOneScreen) {
-  for (const std::vector<std::string>& arguments :
-       {std::vector<std::string>{"--help"}, {"watch", "--help"}, {"demo", "--help"}}) {
+  for (const std::vector<std::string>& arguments : {std::vector<std::string>{"--help"},
+                                                    {"watch", "--help"},
+                                                    {"demo", "--help"},
+                                                    {"cmd", "--help"},
+                                                    {"describe", "--help"}}) {
     ProgramRun run(arguments);
     const std::string help = run.Output();
     EXPECT_EQ(run.Status(), 0);
