@@ -17,6 +17,7 @@
 #include "host/WatchCommand.h"
 #include "host/commands/ConfigCommand.h"
 #include "host/commands/ExplainCommand.h"
+#include "host/commands/PortsCommand.h"
 
 namespace {
 
@@ -33,6 +34,7 @@ struct Arguments {
   DescribeOptions describe;
   ExplainOptions explain;
   ConfigOptions config;
+  PortsOptions ports;
   std::string demoPlugin;
   std::string restartedPlugin;
   std::string restartedPort;
@@ -181,6 +183,9 @@ int Dispatch(const CLI::App& app, const Arguments& arguments) {
   if (app.got_subcommand("config")) {
     return RunConfig(arguments.config);
   }
+  if (app.got_subcommand("ports")) {
+    return RunPorts(arguments.ports);
+  }
   if (app.got_subcommand("demo")) {
     return RunDemo(arguments.demoPlugin);
   }
@@ -205,6 +210,7 @@ int RunCommandLine(int argumentCount, const char* const* arguments) {
     AddDescribe(&app, &values);
     AddExplain(&app, &values.explain);
     AddConfig(&app, &values.config);
+    AddPorts(&app, &values.ports);
     AddDemo(&app, &values);
     try {
       Parse(&app, {arguments + std::min(argumentCount, 1), arguments + argumentCount}, &values);

@@ -1,10 +1,13 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "host/PortList.h"
 
+#include <unistd.h>
+
 #include <algorithm>
 #include <filesystem>
 #include <fstream>
 #include <map>
+#include <utility>
 
 namespace fs = std::filesystem;
 
@@ -46,6 +49,45 @@ std::map<std::string, std::string> StableNames(const fs::path& deviceRoot) {
   return names;
 }
 
+// The first line of a small file; empty when there is none.
+std::string LineOf(const fs::path& file) {
+  std::ifstream stream(file);
+  std::string line;
+  std::getline(stream, line);
+  return line;
+}
+
+// The device that stands above a port's own entry and tells its product: the USB adapter.
+fs::path AdapterOf(const fs::path& classEntry) {
+  constexpr int kMostSteps = 4;
+  std::error_code error;
+  fs::path folder = fs::canonical(classEntry / "device", error);
+  for (int step = 0; !error && step < kMostSteps && folder.has_relative_path(); ++step) {
+    if (fs::exists(folder / "product", error) || fs::exists(folder / "idVendor", error)) {
+      return folder;
+    }
+    folder = folder.parent_path();
+  }
+  return {};
+}
+
+ListedPort Described(const fs::path& classEntry) {
+  ListedPort port;
+  std::error_code error;
+  port.driver = fs::read_symlink(classEntry / "device" / "driver", error).filename().string();
+  std::ifstream latency(classEntry / "device" / "latency_timer");
+  if (!(latency >> port.latencyMs)) {
+    port.latencyMs = -1;
+  }
+  const fs::path adapter = AdapterOf(classEntry);
+  if (!adapter.empty()) {
+    port.manufacturer = LineOf(adapter / "manufacturer");
+    port.product = LineOf(adapter / "product");
+    port.serialNumber = LineOf(adapter / "serial");
+  }
+  return port;
+}
+
 }  // namespace
 
 std::vector<ListedPort> ListPorts(const std::string& classFolder, const std::string& deviceRoot) {
@@ -58,10 +100,14 @@ std::vector<ListedPort> ListPorts(const std::string& classFolder, const std::str
     }
     const std::string device = (fs::path(deviceRoot) / entry.filename()).string();
     const auto found = stableNames.find(entry.filename().string());
+    ListedPort port = Described(entry);
     if (found == stableNames.end()) {
-      plain.push_back({device, ""});
+      port.path = device;
+      plain.push_back(std::move(port));
     } else {
-      stable.push_back({found->second, device});
+      port.path = found->second;
+      port.alias = device;
+      stable.push_back(std::move(port));
     }
   }
   std::sort(stable.begin(), stable.end(),
@@ -87,4 +133,15 @@ std::string StableNameOf(const std::string& path, const std::string& deviceRoot)
 bool HasChangingName(const std::string& path) {
   const std::string name = fs::path(path).filename().string();
   return name.rfind("ttyUSB", 0) == 0 || name.rfind("ttyACM", 0) == 0;
+}
+
+void FindStates(std::vector<ListedPort>* ports) {
+  for (ListedPort& port : *ports) {
+    port.holders = FindPortHolders(port.Device());
+    if (!port.holders.empty()) {
+      port.state = ListedPort::State::kBusy;
+    } else if (access(port.Device().c_str(), R_OK | W_OK) != 0) {
+      port.state = ListedPort::State::kNoRights;
+    }
+  }
 }

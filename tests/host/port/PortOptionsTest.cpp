@@ -1,6 +1,9 @@
 // SPDX-License-Identifier: Apache-2.0
 #include <gtest/gtest.h>
 
+#include <fstream>
+#include <iterator>
+
 #include "host/port/PortOptions.h"
 
 namespace {
@@ -109,6 +112,20 @@ TEST(PortOptions, DescriptionHasALineForEachOption) {
   EXPECT_EQ(lines[0].rfind("flow=none|rtscts|xonxoff ", 0), 0U);
   for (const std::string& line : lines) {
     EXPECT_LE(line.size(), 100U) << line;
+  }
+}
+
+TEST(PortOptions, DocumentHasARowForEachOption) {
+  std::ifstream file(LOKA_SOURCE_DIR "/docs/ports.md");
+  const std::string document{std::istreambuf_iterator<char>(file), {}};
+  for (const PortOptionEntry& entry : PortOptionTable()) {
+    std::string values;
+    for (const char letter : std::string(entry.values)) {
+      values += letter == '|' ? ", " : std::string(1, letter);
+    }
+    const std::string row =
+        "| `" + std::string(entry.name) + "` | " + values + " | " + entry.help + " |\n";
+    EXPECT_NE(document.find(row), std::string::npos) << row;
   }
 }
 
