@@ -13,6 +13,9 @@ class Deadline {
   // The deadline that lies timeoutMs milliseconds ahead; a negative time-out counts as 0.
   static Deadline After(int timeoutMs);
 
+  // The deadline at this point in time.
+  static Deadline At(std::chrono::steady_clock::time_point at) { return Deadline(at); }
+
   bool HasPassed() const;
 
   // Time that is left; zero once the deadline has passed.
