@@ -15,6 +15,8 @@
 #include "host/DescribeCommand.h"
 #include "host/ExitStatus.h"
 #include "host/WatchCommand.h"
+#include "host/commands/SimCommand.h"
+#include "host/sim/SimRun.h"
 #include "host/commands/ConfigCommand.h"
 #include "host/commands/ExplainCommand.h"
 #include "host/commands/PortsCommand.h"
@@ -35,6 +37,7 @@ struct Arguments {
   ExplainOptions explain;
   ConfigOptions config;
   PortsOptions ports;
+  SimOptions sim;
   std::string demoPlugin;
   std::string restartedPlugin;
   std::string restartedPort;
@@ -186,6 +189,9 @@ int Dispatch(const CLI::App& app, const Arguments& arguments) {
   if (app.got_subcommand("ports")) {
     return RunPorts(arguments.ports);
   }
+  if (app.got_subcommand("sim")) {
+    return RunSim(arguments.sim);
+  }
   if (app.got_subcommand("demo")) {
     return RunDemo(arguments.demoPlugin);
   }
@@ -211,6 +217,7 @@ int RunCommandLine(int argumentCount, const char* const* arguments) {
     AddExplain(&app, &values.explain);
     AddConfig(&app, &values.config);
     AddPorts(&app, &values.ports);
+    AddSim(&app, &values.sim);
     AddDemo(&app, &values);
     try {
       Parse(&app, {arguments + std::min(argumentCount, 1), arguments + argumentCount}, &values);
