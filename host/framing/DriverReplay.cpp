@@ -16,6 +16,8 @@
 namespace {
 
 constexpr const char* kProtocolName = "LOKA";
+// A single pass may give a token a byte; the queue must not fill.
+constexpr std::size_t kBytesBetweenLooks = 4096;
 constexpr const char* kTokenUri = "0?rx_token?string-4096";  // two characters a byte, and room
 
 template <typename Interface>
@@ -69,7 +71,11 @@ Replay::~Replay() {
 ReplayResult Replay::Run(const std::string& pluginFile, const std::string& configuration) {
   if (Load(pluginFile) && Configure(configuration) && MakeTags()) {
     host_.MultiTask().SetBetweenPasses([this] { TakeTokens(); });
-    host_.Port().SetNowAndThen([this] { TakeTokens(); });
+    host_.Port().SetBeforeByte([this](std::size_t number) {
+      if (number % kBytesBetweenLooks == 0) {
+        TakeTokens();
+      }
+    });
     host_.Task().Run();
     TakeTokens();
   }

@@ -29,8 +29,9 @@ int ReplayPort::Receive(unsigned char* byte, int timeoutMs, int /*reserved*/) {
   while (event_ < script_->size()) {
     const LineEvent& event = (*script_)[event_];
     if (position_ < event.bytes.size()) {
-      if (++bytesPlayed_ % kBytesBetweenActions == 0 && nowAndThen_) {
-        nowAndThen_();
+      ++bytesPlayed_;
+      if (beforeByte_) {
+        beforeByte_(bytesPlayed_);
       }
       *byte = static_cast<unsigned char>(event.bytes[position_]);
       ++position_;

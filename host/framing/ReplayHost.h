@@ -33,9 +33,8 @@ class ReplayPort final : public ISerialPort {
   // True once a receive has found nothing behind the script's end.
   bool IsPlayed() const { return isPlayed_; }
 
-  // Called in front of every kBytesBetweenActions-th byte: a pass may be long and fill the queue.
-  static constexpr std::size_t kBytesBetweenActions = 4096;
-  void SetNowAndThen(std::function<void()> action) { nowAndThen_ = std::move(action); }
+  // Called in front of each byte with its number, from 1 on.
+  void SetBeforeByte(std::function<void(std::size_t)> action) { beforeByte_ = std::move(action); }
 
  private:
   const LineScript* const script_;
@@ -43,7 +42,7 @@ class ReplayPort final : public ISerialPort {
   std::size_t position_ = 0;  // of the next byte in the event, or ms of the silence gone by
   bool isPlayed_ = false;
   std::size_t bytesPlayed_ = 0;
-  std::function<void()> nowAndThen_;
+  std::function<void(std::size_t)> beforeByte_;
 };
 
 class ReplaySerialFactory final : public ISerialFactory {
