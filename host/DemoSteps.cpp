@@ -8,8 +8,6 @@
 #include "host/ChildProcess.h"
 #include "host/Deadline.h"
 
-using std::string_literals::operator""s;
-
 namespace {
 
 constexpr int kLimitMs = 20000;
@@ -131,13 +129,13 @@ void DemoSteps::GapOnly() {
 }
 
 void DemoSteps::HexTokens() {
-  StartHost(kFramed + " hex_tokens=true"s, false);
-  DeviceSends("\x02\x00\x1B\xFF\x03"s);
+  StartHost(std::string(kFramed) + " hex_tokens=true", false);
+  DeviceSends(std::string("\x02\x00\x1B\xFF\x03", 5));
   ExpectToken("001BFF");
 }
 
 void DemoSteps::QueueOverflow() {
-  StartHost(kFramed + " token_queue_size=3"s, false);
+  StartHost(std::string(kFramed) + " token_queue_size=3", false);
   const std::string bytes =
       "\x02"
       "A\x03\x02"

@@ -9,5 +9,8 @@ enum class ExitStatus : int {
   kPlugin = 3,         // the plug-in cannot be loaded or lacks an interface or a description
   kConfiguration = 4,  // the driver rejects the configuration
   kPort = 5,           // the port cannot be opened or set up
+  kPortLost = 6,       // the line was lost and reconnect=off
+  kDifference = 7,     // the driver and the host read the same bytes differently
+  kTimeout = 27,       // what was waited for did not come in time
   kFirstSignal = 128,
 };

@@ -72,6 +72,12 @@ class HostSession {
   SqliteStorage* Storage() const { return storage_.get(); }
   const std::string& Ident() const { return options_.ident; }
 
+  // Empty without permanent storage.
+  const std::string& StoreFile() const { return options_.storeFile; }
+
+  // The path behind a port name; empty when there is none.
+  std::string PathOf(const std::string& portName) const { return options_.ports.PathFor(portName); }
+
   // Why a port could not be opened or set up the last time (see PosixSerialFactory::LastProblem).
   PortProblem LastPortProblem() const { return serialFactory_.LastProblem(); }
 

@@ -43,7 +43,7 @@ bool HostTag::ReadNumber(unsigned int* value) const {
   return true;
 }
 
-bool HostTag::WriteNumber(unsigned int value) const {
+bool HostTag::WriteNumber(unsigned int value) {
   const std::uint32_t number = value;
   if (ValueBytes(tag_) == 1) {
     return Write(std::string(1, static_cast<char>(static_cast<unsigned char>(value))));
@@ -68,7 +68,7 @@ bool HostTag::ReadText(std::string* text) const {
   return true;
 }
 
-bool HostTag::WriteText(const std::string& text) const {
+bool HostTag::WriteText(const std::string& text) {
   if (text.size() >= ValueBytes(tag_) || text.find('\0') != std::string::npos) {
     return false;
   }
@@ -86,17 +86,22 @@ bool HostTag::ReadBytes(std::string* bytes) const {
   return true;
 }
 
-bool HostTag::WriteBytes(const std::string& bytes) const {
+bool HostTag::WriteBytes(const std::string& bytes) {
   return bytes.size() == ValueBytes(tag_) && Write(bytes);
 }
 
-bool HostTag::Write(const std::string& value) const {
+bool HostTag::Write(const std::string& value) {
   const std::vector<unsigned char> bytes(value.begin(), value.end());
+  storeError_.clear();
   // Ends after the driver has let its semaphore go; only then is the disk touched. A failure to
   // store is told by the storage itself and does not undo what the driver did.
-  const StorageBatch batch(storage_);
-  return protocol_->Write(tag_, bytes.data()) != 0;
+  StorageBatch batch(storage_);
+  const bool isWritten = protocol_->Write(tag_, bytes.data()) != 0;
+  (void)batch.End(&storeError_);
+  return isWritten;
 }
+
+int HostTag::ErrorCode() const { return protocol_->GetLastError(); }
 
 std::string HostTag::Error() const {
   const char* const text = protocol_->GetLastErrorString();

@@ -35,6 +35,15 @@ bool TokenReader::Prepare() {
   return acknowledgeTag_ != nullptr;
 }
 
+void TokenReader::GiveTagsBack() {
+  availableTag_.reset();
+  lengthTag_.reset();
+  hexTag_.reset();
+  acknowledgeTag_.reset();
+  tokenTag_.reset();
+  roomCharacters_ = 0;
+}
+
 bool TokenReader::ReadNumber(const HostTag& tag, unsigned int* value) {
   if (tag.ReadNumber(value)) {
     return true;

@@ -43,6 +43,9 @@ class TokenReader {
   // Tokens that wait; false when the driver refuses.
   bool CountWaiting(unsigned int* count);
 
+  // Frees the tags that the reader keeps; the next call makes them again.
+  void GiveTagsBack();
+
   // The driver's text for the last failure.
   const std::string& Error() const { return error_; }
 

@@ -2,6 +2,7 @@
 #include "host/events/EventJson.h"
 
 #include <nlohmann/json.hpp>
+#include <stdexcept>
 #include <utility>
 
 #include "host/ByteText.h"
@@ -35,6 +36,9 @@ class DetailWriter {
     }
     if (detail.isCut) {
       Set("cut", true);
+    }
+    if (!detail.frame.empty()) {
+      Set("frame", CompactHex(detail.frame));
     }
   }
 
@@ -110,7 +114,7 @@ OrderedJson ToOrderedJson(const HostEvent& event) {
 std::string BytesOf(const nlohmann::json& json, const char* key) {
   std::string bytes;
   if (!ParseHexBytes(json.at(key).get<std::string>(), &bytes)) {
-    throw nlohmann::json::other_error::create(500, "no hexadecimal text", json);
+    throw std::invalid_argument("no hexadecimal text");
   }
   return bytes;
 }
@@ -124,9 +128,13 @@ HostEvent::Detail DetailOf(const std::string& kind, const nlohmann::json& json) 
     return BytesSent{BytesOf(json, "hex"), json.at("sent").get<std::uint64_t>()};
   }
   if (kind == "token") {
-    return TokenReceived{json.at("n").get<std::uint64_t>(),      BytesOf(json, "hex"),
-                         json.at("len").get<unsigned int>(),     json.at("waiting").get<unsigned>(),
-                         json.value("dur_us", std::int64_t{-1}), json.value("cut", false)};
+    return TokenReceived{json.at("n").get<std::uint64_t>(),
+                         BytesOf(json, "hex"),
+                         json.at("len").get<unsigned int>(),
+                         json.at("waiting").get<unsigned>(),
+                         json.value("dur_us", std::int64_t{-1}),
+                         json.value("cut", false),
+                         json.contains("frame") ? BytesOf(json, "frame") : ""};
   }
   if (kind == "drop") {
     return BytesDropped{text("why"), BytesOf(json, "hex"), json.value("after_ms", 0)};
@@ -146,7 +154,7 @@ HostEvent::Detail DetailOf(const std::string& kind, const nlohmann::json& json) 
   if (kind == "note") {
     return NoteMade{text("text")};
   }
-  throw nlohmann::json::other_error::create(501, "no kind of event: " + kind, json);
+  throw std::invalid_argument("no kind of event: " + kind);
 }
 
 }  // namespace
@@ -165,7 +173,7 @@ bool FromJson(const nlohmann::json& json, HostEvent* event) {
     read.detail = DetailOf(json.at("ev").get<std::string>(), json);
     *event = std::move(read);
     return true;
-  } catch (const nlohmann::json::exception&) {
-    return false;
+  } catch (const std::exception&) {
+    return false;  // a key is missing, or its value is not what it must be
   }
 }

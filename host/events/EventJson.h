@@ -11,7 +11,7 @@
 //   all       t (UTC, microseconds), ev, port
 //   rx        hex
 //   tx        hex, sent (bytes that the line took)
-//   token     n, len, text, hex, waiting, dur_us (only when known), cut (only when true)
+//   token     n, len, text, hex, waiting, dur_us and frame (when known), cut (only when true)
 //   drop      why, hex, after_ms (only behind a silence)
 //   port      state, errno (only when there is one), text
 //   setting   state, key, value, previous (only when known)

@@ -27,6 +27,7 @@ struct TokenReceived {
   unsigned int waiting = 0;      // tokens in the queue, this one included
   std::int64_t durationUs = -1;  // from the frame's first to its last byte; -1 not known
   bool isCut = false;
+  std::string frame;  // as it came on the line, prefix and suffix included; empty when not known
 };
 
 // Bytes that did not become part of a token.

@@ -2,11 +2,9 @@
 #include "host/instance/Answer.h"
 
 nlohmann::json ToJson(const Answer& answer) {
-  return {{"ok", answer.IsDone()},
-          {"status", static_cast<int>(answer.status)},
-          {"text", answer.text},
-          {"hints", answer.hints},
-          {"data", answer.data}};
+  return {{"ok", answer.IsDone()}, {"status", static_cast<int>(answer.status)},
+          {"text", answer.text},   {"code", answer.errorCode},
+          {"hints", answer.hints}, {"data", answer.data}};
 }
 
 bool FromJson(const nlohmann::json& json, Answer* answer) {
@@ -14,6 +12,7 @@ bool FromJson(const nlohmann::json& json, Answer* answer) {
     Answer read;
     read.status = static_cast<ExitStatus>(json.at("status").get<int>());
     read.text = json.at("text").get<std::string>();
+    read.errorCode = json.at("code").get<int>();
     read.hints = json.at("hints").get<std::vector<std::string>>();
     read.data = json.at("data");
     if (json.at("ok").get<bool>() != read.IsDone()) {

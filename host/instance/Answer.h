@@ -11,7 +11,8 @@
 // How a request to an instance went, in this process or in another one.
 struct Answer {
   ExitStatus status = ExitStatus::kDone;
-  std::string text;  // what was refused and why, in the driver's words where it has some
+  std::string text;   // what was refused and why, in the driver's words where it has some
+  int errorCode = 0;  // the driver's number for that; 0 where the refusal is not the driver's
   std::vector<std::string> hints;  // what to know or to do, one line each; also behind a success
   nlohmann::json data = nlohmann::json::object();  // what was asked for, by name
 
@@ -25,7 +26,7 @@ inline Answer Refusal(std::string text, ExitStatus status = ExitStatus::kRefused
   return answer;
 }
 
-// Both ways for the control socket: {"ok", "status", "text", "hints", "data"}.
+// Both ways for the control socket: {"ok", "status", "text", "code", "hints", "data"}.
 nlohmann::json ToJson(const Answer& answer);
 
 // False for anything that ToJson does not write.

@@ -160,6 +160,16 @@ std::string ShowSetting(const SettingEntry& setting, const std::string& tagValue
   return tagValue;
 }
 
+std::string ShowStored(const SettingEntry& setting, const StoredValue& value) {
+  if (const auto* const text = std::get_if<std::string>(&value)) {
+    return ShowSetting(setting, *text);
+  }
+  if (const auto* const flag = std::get_if<bool>(&value)) {
+    return ShowSetting(setting, *flag ? "1" : "0");
+  }
+  return ShowSetting(setting, std::to_string(std::get<int>(value)));
+}
+
 std::string ShowConfigured(const SettingEntry& setting, const std::string& configValue) {
   if (setting.form == SettingForm::kNumber) {
     return std::to_string(std::strtol(configValue.c_str(), nullptr, 0));
@@ -201,4 +211,12 @@ std::string AllowedValues(const SettingEntry& setting) {
       break;
   }
   return "a number";
+}
+
+std::string SettingNames() {
+  std::string text;
+  for (const SettingEntry& setting : kSettingTable) {
+    text += (text.empty() ? "" : ", ") + std::string(setting.key);
+  }
+  return text;
 }

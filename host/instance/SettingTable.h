@@ -4,6 +4,8 @@
 #include <array>
 #include <string>
 
+#include "host/StoredValue.h"
+
 // The twelve settings that can change while the driver runs, under all their names: the key in the
 // permanent storage and on our command line, the key in the configuration text, the memory type of
 // the tag that stages it. The only place in the host that lists them.
@@ -49,6 +51,9 @@ std::string TagUri(const SettingEntry& setting);
 // A tag's value as people write it: "even" for 1, "none" for the empty prefix, "true" for 1.
 std::string ShowSetting(const SettingEntry& setting, const std::string& tagValue);
 
+// The same for a value of the permanent storage.
+std::string ShowStored(const SettingEntry& setting, const StoredValue& value);
+
 // The same for a value of the configuration text.
 std::string ShowConfigured(const SettingEntry& setting, const std::string& configValue);
 
@@ -58,5 +63,8 @@ std::string ShowConfigured(const SettingEntry& setting, const std::string& confi
 bool ParseSetting(const SettingEntry& setting, const std::string& value, std::string* tagValue,
                   std::string* error);
 
-// The baud rates that the driver takes, for messages: "300, 600, ... or 115200".
+// What the driver takes, for messages: "7 or 8".
 std::string AllowedValues(const SettingEntry& setting);
+
+// The keys of all settings, for messages: "baud, parity, ...".
+std::string SettingNames();

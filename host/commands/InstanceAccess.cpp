@@ -1,0 +1,215 @@
+// SPDX-License-Identifier: Apache-2.0
+#include "host/commands/InstanceAccess.h"
+
+#include <CLI/CLI.hpp>
+#include <algorithm>
+#include <filesystem>
+#include <system_error>
+#include <utility>
+#include <vector>
+
+#include "host/Output.h"
+#include "host/Utf8Text.h"
+#include "host/control/AttachedInstance.h"
+#include "host/control/ControlPath.h"
+#include "host/framing/ConfigEdit.h"
+#include "host/instance/LocalInstance.h"
+
+namespace {
+
+// The names of running instances that a command may mean.
+std::vector<std::string> Candidates(const InstanceAccess& access) {
+  std::vector<std::string> names = ControlNames();
+  const std::string portName =
+      access.instanceName.empty() ? access.options.PortName() : access.instanceName;
+  if (!portName.empty()) {
+    names.erase(std::remove_if(names.begin(), names.end(),
+                               [&](const std::string& name) { return name != portName; }),
+                names.end());
+  }
+  return names;
+}
+
+// The running instance has the port that the command line names, or that names none.
+bool HasWantedPort(const InstanceAccess& access, const AttachedInstance& instance) {
+  PortMap ports;
+  for (const std::string& word : access.options.portWords) {
+    std::string ignored;  // whoever starts an instance says what is wrong with a word
+    (void)ports.Add(word, &ignored);
+  }
+  const std::string wanted = ports.PathFor(instance.Port());
+  const std::string path = instance.Info().value("path", "");
+  std::error_code error;
+  return wanted.empty() || wanted == path || std::filesystem::equivalent(wanted, path, error);
+}
+
+void TellAttached(const InstanceAccess& access, const AttachedInstance& instance) {
+  if (access.isQuiet) {
+    return;
+  }
+  const nlohmann::json& info = instance.Info();
+  TellUser("attached to the running instance " + instance.Port() + " (process " +
+           std::to_string(info.value("pid", 0)) + ", " + info.value("path", "") + ")");
+  if (access.framing.IsGiven() || !access.configSource.empty()) {
+    TellUser("its own configuration holds; that of the command line is left out");
+  }
+}
+
+std::string Join(const std::vector<std::string>& words) {
+  std::string text;
+  for (const std::string& word : words) {
+    text += (text.empty() ? "" : ", ") + word;
+  }
+  return text;
+}
+
+// The running instance, or null: then `answer` says whether that is a failure.
+std::unique_ptr<Instance> Attach(const InstanceAccess& access, Answer* answer) {
+  std::vector<std::unique_ptr<AttachedInstance>> found;
+  std::vector<std::string> foundNames;
+  for (const std::string& name : Candidates(access)) {
+    std::string error;
+    auto instance = AttachedInstance::Connect(name, &error);
+    if (instance != nullptr && HasWantedPort(access, *instance)) {
+      found.push_back(std::move(instance));
+      foundNames.push_back(name);
+    }
+  }
+  if (found.size() > 1) {
+    *answer = Refusal(
+        "several instances are running: " + Join(foundNames) + "; say which with --instance",
+        ExitStatus::kUsage);
+    return nullptr;
+  }
+  if (found.empty()) {
+    if (access.isAttachWanted) {
+      *answer = Refusal(access.options.portWords.empty() ? "no instance is running"
+                                                         : "no instance is running on this port",
+                        ExitStatus::kPort);
+      answer->hints.push_back("loka run starts one");
+    }
+    return nullptr;
+  }
+  TellAttached(access, *found.front());
+  return std::move(found.front());
+}
+
+}  // namespace
+
+void AddInstanceAccess(CLI::App* command, InstanceAccess* access, bool hasPortWord) {
+  InstanceOptions& options = access->options;
+  if (hasPortWord) {
+    command->add_option("PORT", access->portWord, "Port to open: a path or comN=PATH[,OPTION...]")
+        ->type_name("");
+  }
+  command->add_option("--port", options.portWords, "The same; may be given more than once")
+      ->type_name("PORT")
+      ->expected(1)
+      ->take_all();
+  command
+      ->add_option("-c,--config", access->configSource,
+                   "Configuration: a file, - for standard input, or the text itself")
+      ->type_name("CONFIG");
+  access->framing.AddAll(command);
+  CLI::Option* const store =
+      command->add_option("--store", options.storeFile, "File with the stored settings")
+          ->type_name("FILE");
+  command->add_flag("--no-store", options.withoutStore, "Neither use nor keep stored settings")
+      ->excludes(store);
+  command->add_option("--ident", options.ident, "Whose stored settings (else the port name)")
+      ->type_name("NAME");
+  command
+      ->add_option("--plugin", options.pluginFile,
+                   "Driver to load (else $LOKA_PLUGIN, else beside loka)")
+      ->type_name("FILE");
+  command
+      ->add_option("--instance", access->instanceName, "Running instance to attach to, by its port")
+      ->type_name("NAME");
+  CLI::Option* const attach =
+      command->add_flag("--attach", access->isAttachWanted, "Only with a running instance");
+  command->add_flag("--no-attach", access->isAttachRefused, "Never with a running instance")
+      ->excludes(attach);
+}
+
+bool Resolve(InstanceAccess* access, Answer* answer) {
+  InstanceOptions& options = access->options;
+  if (!access->portWord.empty()) {
+    options.portWords.push_back(access->portWord);
+  }
+  std::string error;
+  if (!access->configSource.empty() &&
+      !ReadConfiguration(access->configSource, &options.configuration, &error)) {
+    *answer = Refusal(error, ExitStatus::kUsage);
+    return false;
+  }
+  if (!options.configuration.empty()) {
+    options.configuration = access->framing.Apply(options.configuration);
+  } else if (access->framing.IsGiven() || !options.portWords.empty()) {
+    options.configuration = access->framing.Configuration();
+  }
+  return true;
+}
+
+std::unique_ptr<Instance> OpenInstance(InstanceAccess* access, Answer* answer) {
+  if (!Resolve(access, answer)) {
+    return nullptr;
+  }
+  if (!access->isAttachRefused) {
+    auto attached = Attach(*access, answer);
+    if (attached != nullptr || !answer->IsDone()) {
+      return attached;
+    }
+  }
+  return BeginInstance(*access, answer);
+}
+
+std::unique_ptr<LocalInstance> BeginInstance(const InstanceAccess& access, Answer* answer) {
+  if (access.options.configuration.empty()) {
+    *answer = Refusal("no configuration and no running instance", ExitStatus::kUsage);
+    answer->hints.push_back("give --config FILE or framing flags with a port, or start loka run");
+    return nullptr;
+  }
+  auto instance =
+      LocalInstance::Open({access.options, access.acknowledges, access.connects}, answer);
+  if (instance != nullptr) {
+    HostOptions host;
+    std::string error;
+    if (MakeHostOptions(access.options, &host, &error) && !access.isQuiet) {
+      TellSettings(access.options, host, instance->Session());
+    }
+  }
+  return instance;
+}
+
+std::vector<std::string> DescribeAnswer(const Answer& answer) {
+  std::vector<std::string> lines;
+  if (!answer.text.empty()) {
+    const std::string number =
+        answer.errorCode == 0 ? "" : "error " + std::to_string(answer.errorCode) + ": ";
+    lines.push_back(number + PrintableUtf8(answer.text));
+  }
+  for (const std::string& hint : answer.hints) {
+    if (answer.IsDone()) {
+      lines.push_back(PrintableUtf8(hint));
+    } else if (answer.errorCode != 0 && lines.size() == 1) {
+      lines.back() += "   hint: " + PrintableUtf8(hint);
+    } else {
+      lines.push_back("hint: " + PrintableUtf8(hint));
+    }
+  }
+  return lines;
+}
+
+int TellAnswer(const Answer& answer) {
+  for (const std::string& line : DescribeAnswer(answer)) {
+    TellUser(line);
+  }
+  return static_cast<int>(answer.status);
+}
+
+int EndOf(const Instance& instance, const Answer& answer) {
+  const int status = TellAnswer(answer);
+  return instance.StopSignal() == 0
+             ? status
+             : static_cast<int>(ExitStatus::kFirstSignal) + instance.StopSignal();
+}

@@ -1,0 +1,54 @@
+// SPDX-License-Identifier: Apache-2.0
+#pragma once
+
+#include <memory>
+#include <string>
+#include <vector>
+
+#include "host/InstanceOptions.h"
+#include "host/framing/FramingFlags.h"
+#include "host/instance/Instance.h"
+
+class LocalInstance;
+
+namespace CLI {
+class App;
+}
+
+// How a command finds its driver: the running instance of another process, which owns the port and
+// answers on a control socket, or one of its own for as long as the command lasts.
+struct InstanceAccess {
+  InstanceOptions options;
+  FramingFlags framing;
+  std::string portWord;      // the positional PORT
+  std::string configSource;  // --config: a file, "-" or the text itself
+  std::string instanceName;  // --instance; empty: the only one, or that of the configured port
+  bool isQuiet = false;
+  bool isAttachWanted = false;
+  bool isAttachRefused = false;
+  bool acknowledges = true;
+  bool connects = true;
+};
+
+// Adds PORT, --port, --config, the framing flags, --store, --attach and the like.
+void AddInstanceAccess(CLI::App* command, InstanceAccess* access, bool hasPortWord = true);
+
+// Fills in what follows from the flags: the configuration text and the port words. False with the
+// reason in `answer`.
+bool Resolve(InstanceAccess* access, Answer* answer);
+
+// Attaches or starts, as the flags say; tells on standard error which, and what a started instance
+// runs with. Null with the reason in `answer`.
+std::unique_ptr<Instance> OpenInstance(InstanceAccess* access, Answer* answer);
+
+// The second half of OpenInstance alone: always an instance of its own.
+std::unique_ptr<LocalInstance> BeginInstance(const InstanceAccess& access, Answer* answer);
+
+// A refusal and its hints as lines for people: "error -1: token too long   hint: 14 bytes ...".
+std::vector<std::string> DescribeAnswer(const Answer& answer);
+
+// Tells a refusal and its hints on standard error. Returns the exit status of the program.
+int TellAnswer(const Answer& answer);
+
+// The exit status for a command that was served: 128 + n after a signal.
+int EndOf(const Instance& instance, const Answer& answer);

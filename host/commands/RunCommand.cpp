@@ -1,0 +1,123 @@
+// SPDX-License-Identifier: Apache-2.0
+#include "host/commands/RunCommand.h"
+
+#include <CLI/CLI.hpp>
+#include <limits>
+
+#include "host/Output.h"
+#include "host/control/ControlPath.h"
+#include "host/events/EventSink.h"
+#include "host/events/EventText.h"
+#include "host/events/JsonLine.h"
+#include "host/events/WallClock.h"
+#include "host/instance/LocalInstance.h"
+
+namespace {
+
+constexpr int kForeverMs = std::numeric_limits<int>::max();
+
+// Writes what happens to standard error, one line with the time each, as a service's journal wants
+// it.
+class LogPrinter final : public EventSink {
+ public:
+  explicit LogPrinter(int verbosity) : verbosity_(verbosity) {}
+
+  void OnEvent(const HostEvent& event) override {
+    const bool isTraffic = std::holds_alternative<BytesReceived>(event.detail) ||
+                           std::holds_alternative<BytesSent>(event.detail);
+    const bool isToken = std::holds_alternative<TokenReceived>(event.detail);
+    if ((isTraffic && verbosity_ < 2) || (isToken && verbosity_ < 1)) {
+      return;
+    }
+    TellUser(LocalTimeText(event.timeUs) + " " + EventText(event));
+  }
+
+ private:
+  const int verbosity_;
+};
+
+std::string CountText(const nlohmann::json& data, const char* key) {
+  return std::to_string(data.value(key, std::uint64_t{0}));
+}
+
+void PrintStats(const nlohmann::json& data) {
+  std::string drops;
+  std::uint64_t dropCount = 0;
+  for (const auto& [reason, count] : data.at("drops").items()) {
+    drops +=
+        (drops.empty() ? "" : ", ") + reason + " " + std::to_string(count.get<std::uint64_t>());
+    dropCount += count.get<std::uint64_t>();
+  }
+  std::string text = "tokens " + CountText(data, "tokens");
+  text += "  dropped " + std::to_string(dropCount) + (drops.empty() ? "" : " (" + drops + ")");
+  text += "  lost sends " + CountText(data, "lost_sends");
+  text += "  reconnects " + CountText(data, "reconnects");
+  text += "  findings " + CountText(data, "findings");
+  (void)WriteResult(text + "\n");
+}
+
+}  // namespace
+
+void AddRun(CLI::App* app, RunOptions* options) {
+  CLI::App* const run = app->add_subcommand("run", "Own a port and stay, for others to attach");
+  run->add_option("--ack", options->acknowledge,
+                  "auto: take each token, publish and acknowledge it; never: leave that to others")
+      ->check(CLI::IsMember({"auto", "never"}))
+      ->type_name("WHO")
+      ->capture_default_str();
+  run->add_flag("-v", options->verbosity, "Tokens too; -vv: every byte");
+  AddInstanceAccess(run, &options->access);
+  run->footer("Example: loka run --config scale.cfg /dev/ttyUSB0 --ack never");
+}
+
+int RunRun(RunOptions* options) {
+  options->access.acknowledges = options->acknowledge == "auto";
+  Answer answer;
+  if (!Resolve(&options->access, &answer)) {
+    return TellAnswer(answer);
+  }
+  const auto instance = BeginInstance(options->access, &answer);
+  if (instance == nullptr) {
+    return TellAnswer(answer);
+  }
+  std::string error;
+  if (!instance->Share(&error)) {
+    TellUser(error);
+    return static_cast<int>(ExitStatus::kPort);
+  }
+  TellUser("tokens are " + std::string(options->access.acknowledges
+                                           ? "taken, published and acknowledged (--ack auto)"
+                                           : "left to those who attach (--ack never)"));
+  TellUser("ready; commands attach at " + ControlPath(instance->Port()));
+  LogPrinter printer(options->verbosity);
+  answer = instance->Serve(
+      &printer, [] { return false; }, Deadline::After(kForeverMs));
+  return EndOf(*instance, answer);
+}
+
+void AddStats(CLI::App* app, StatsOptions* options) {
+  CLI::App* const stats = app->add_subcommand("stats", "Show the counters of a running instance");
+  stats->add_flag("-j,--json", options->isJson, "As one JSON object");
+  stats->add_option("--instance", options->access.instanceName, "Which one, by its port")
+      ->type_name("NAME");
+  stats->footer("Example: loka stats -j");
+}
+
+int RunStats(StatsOptions* options) {
+  options->access.isAttachWanted = true;
+  Answer answer;
+  const auto instance = OpenInstance(&options->access, &answer);
+  if (instance == nullptr) {
+    return TellAnswer(answer);
+  }
+  answer = instance->Call({{"op", "stats"}});
+  if (!answer.IsDone()) {
+    return TellAnswer(answer);
+  }
+  if (options->isJson) {
+    (void)WriteResult(JsonLine(answer.data) + "\n");
+  } else {
+    PrintStats(answer.data);
+  }
+  return 0;
+}

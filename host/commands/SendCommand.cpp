@@ -1,0 +1,159 @@
+// SPDX-License-Identifier: Apache-2.0
+#include "host/commands/SendCommand.h"
+
+#include <CLI/CLI.hpp>
+#include <fstream>
+#include <iostream>
+#include <iterator>
+
+#include "host/ByteText.h"
+#include "host/Output.h"
+#include "host/commands/EventPrinter.h"
+#include "host/framing/ControlNames.h"
+
+namespace {
+
+constexpr std::size_t kMaxPayloadBytes = 256U * 1024U;
+
+Answer SendBytes(Instance* instance, const std::string& bytes) {
+  return instance->Call({{"op", "send"}, {"hex", CompactHex(bytes)}});
+}
+
+bool ReadAll(std::istream* stream, std::string* bytes, std::string* error) {
+  bytes->assign(std::istreambuf_iterator<char>(*stream), std::istreambuf_iterator<char>());
+  if (bytes->size() > kMaxPayloadBytes) {
+    *error = "more than " + std::to_string(kMaxPayloadBytes) + " bytes are no token";
+    return false;
+  }
+  return true;
+}
+
+bool ReadFile(const std::string& path, std::string* bytes, std::string* error) {
+  if (path == "-") {
+    return ReadAll(&std::cin, bytes, error);
+  }
+  std::ifstream stream(path, std::ios::binary);
+  if (!stream) {
+    *error = path + " cannot be read";
+    return false;
+  }
+  return ReadAll(&stream, bytes, error);
+}
+
+// Every line of standard input as a token of its own, without its line end.
+Answer SendLines(Instance* instance) {
+  std::string line;
+  while (instance->StopSignal() == 0 && std::getline(std::cin, line)) {
+    Answer answer = SendBytes(instance, line);
+    if (!answer.IsDone()) {
+      return answer;
+    }
+  }
+  return {};
+}
+
+}  // namespace
+
+void PayloadFlags::Add(CLI::App* command, bool withFile) {
+  CLI::Option_group* const group = command->add_option_group("What to send");
+  group->add_option("-m,--message", text, "Text")->type_name("TEXT");
+  group->add_option("-x,--hex-message", hexText, "Bytes: 02 41, STX 41 CR LF")->type_name("HEX");
+  if (withFile) {
+    group->add_option("-f,--file", file, "Content of a file; - is standard input")
+        ->type_name("FILE");
+  }
+}
+
+bool PayloadFlags::Bytes(std::string* bytes, std::string* error) const {
+  if (!file.empty()) {
+    return ReadFile(file, bytes, error);
+  }
+  if (!hexText.empty()) {
+    return ParseControlText(hexText, bytes, error);
+  }
+  *bytes = text;
+  return true;
+}
+
+void AddSend(CLI::App* app, SendOptions* options) {
+  CLI::App* const send = app->add_subcommand("send", "Send one token, or one a line");
+  options->payload.Add(send, true);
+  CLI::App* const group = send->get_option_group("What to send");
+  group->add_flag("-l,--lines", options->isByLine, "Each line of standard input");
+  group->require_option(1);
+  send->add_flag("-q,--quiet", options->access.isQuiet, "Say nothing when it is done");
+  AddInstanceAccess(send, &options->access);
+  send->footer("Example: loka send /dev/ttyUSB0 -b 9600 -p none --tx-suffix CRLF -m R");
+}
+
+int RunSend(SendOptions* options) {
+  std::string bytes;
+  std::string error;
+  if (!options->isByLine && !options->payload.Bytes(&bytes, &error)) {
+    TellUser(error);
+    return static_cast<int>(ExitStatus::kUsage);
+  }
+  options->access.acknowledges = false;
+  Answer answer;
+  const auto instance = OpenInstance(&options->access, &answer);
+  if (instance == nullptr) {
+    return TellAnswer(answer);
+  }
+  answer = options->isByLine ? SendLines(instance.get()) : SendBytes(instance.get(), bytes);
+  return EndOf(*instance, answer);
+}
+
+void AddAsk(CLI::App* app, AskOptions* options) {
+  CLI::App* const ask = app->add_subcommand("ask", "Send a token, print the next one");
+  options->payload.Add(ask, false);
+  ask->get_option_group("What to send")->require_option(1);
+  ask->add_option("-W,--wait", options->limitSeconds, "Seconds to wait; exit status 27")
+      ->type_name("S")
+      ->check(CLI::Range(0.001, 2000000.0))
+      ->capture_default_str();
+  ask->add_flag("--fresh", options->isFresh, "Drop first what is waiting");
+  CLI::Option* const json = ask->add_flag("-j,--json", options->isJson, "Answer as JSON");
+  ask->add_flag("-X,--hex-output", options->isHex, "Answer as hexadecimal")->excludes(json);
+  ask->add_flag("-q,--quiet", options->access.isQuiet, "Nothing beside the answer");
+  AddInstanceAccess(ask, &options->access);
+  ask->footer("Example: loka ask /dev/ttyUSB0 -b 9600 -p none --rx-suffix CRLF -m R -W 2 --fresh");
+}
+
+int RunAsk(AskOptions* options) {
+  std::string bytes;
+  std::string error;
+  if (!options->payload.Bytes(&bytes, &error)) {
+    TellUser(error);
+    return static_cast<int>(ExitStatus::kUsage);
+  }
+  Answer answer;
+  const auto instance = OpenInstance(&options->access, &answer);
+  if (instance == nullptr) {
+    return TellAnswer(answer);
+  }
+  if (options->isFresh) {
+    answer = instance->Call({{"op", "ack"}, {"all", true}});
+  }
+  if (answer.IsDone()) {
+    answer = instance->Subscribe();
+  }
+  if (answer.IsDone()) {
+    answer = SendBytes(instance.get(), bytes);
+  }
+  if (!answer.IsDone()) {
+    return EndOf(*instance, answer);
+  }
+  PrintOptions print;
+  print.isQuiet = options->access.isQuiet;
+  print.form = options->isJson  ? PrintOptions::Form::kJson
+               : options->isHex ? PrintOptions::Form::kHex
+                                : PrintOptions::Form::kText;
+  EventPrinter printer(print);
+  const auto isDone = [&] { return printer.TokenCount() > 0; };
+  answer = instance->Serve(&printer, isDone,
+                           Deadline::After(static_cast<int>(options->limitSeconds * 1000)));
+  if (answer.status == ExitStatus::kTimeout) {
+    answer.text = "no answer within the time of -W";
+  }
+  return EndOf(*instance, answer);
+}

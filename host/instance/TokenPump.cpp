@@ -1,0 +1,186 @@
+// SPDX-License-Identifier: Apache-2.0
+#include "host/instance/TokenPump.h"
+
+#include <algorithm>
+#include <utility>
+
+#include "host/events/EventStream.h"
+#include "host/instance/Requests.h"
+#include "host/port/ErrorName.h"
+
+namespace {
+
+// More of the line's tokens than any queue of the driver holds are not worth keeping.
+constexpr std::size_t kMaxLineTokens = 20000;
+constexpr std::int64_t kNsPerUs = 1000;
+
+}  // namespace
+
+TokenPump::TokenPump(HostSession* session, EventStream* events, const Requests* requests,
+                     bool acknowledges)
+    : events_(events),
+      requests_(requests),
+      acknowledges_(acknowledges),
+      reader_(session),
+      check_(requests->Framing(), this),
+      labeller_(requests->Framing(), this),
+      settingsVersion_(requests->SettingsVersion()) {}
+
+Answer TokenPump::Run(const std::vector<LineRecord>& records) {
+  FollowSettings();
+  for (const LineRecord& record : records) {
+    Follow(record);
+  }
+  return PublishTokens();
+}
+
+// Settings change behind everything that the driver was given before.
+void TokenPump::FollowSettings() {
+  const std::uint64_t version = requests_->SettingsVersion();
+  if (version != settingsVersion_) {
+    settingsVersion_ = version;
+    check_.ChangeSettings(requests_->Framing());
+    labeller_.ChangeSettings(requests_->Framing());
+    lineTokens_.clear();
+  }
+}
+
+void TokenPump::Follow(const LineRecord& record) {
+  recordTimeUs_ = record.timeUs;
+  switch (record.kind) {
+    case LineRecord::Kind::kServed:
+      events_->Publish(BytesReceived{record.bytes}, record.timeUs);
+      FollowBytes(record);
+      break;
+    case LineRecord::Kind::kSilence:
+      FollowSilence(record.silenceMs);
+      break;
+    case LineRecord::Kind::kSent:
+      events_->Publish(BytesSent{record.bytes, record.takenBytes}, record.timeUs);
+      break;
+    case LineRecord::Kind::kLost:
+      events_->Publish(PortChanged{"lost", ErrorName(record.errorNumber), record.text},
+                       record.timeUs);
+      break;
+    case LineRecord::Kind::kBack:
+      events_->Publish(PortChanged{"back", "", record.text}, record.timeUs);
+      break;
+    case LineRecord::Kind::kNote:
+      events_->Publish(NoteMade{record.text}, record.timeUs);
+      break;
+  }
+}
+
+void TokenPump::FollowBytes(const LineRecord& record) {
+  recordFirstNs_ = record.firstArrivalNs;
+  recordLastNs_ = record.lastArrivalNs;
+  servedBytes_ += record.bytes.size();
+  if (!frameFirstNs_) {
+    frameFirstNs_ = record.firstArrivalNs;
+  }
+  if (acknowledges_) {
+    check_.OnBytes(record.bytes);
+  } else {
+    labeller_.OnBytes(record.bytes);
+  }
+}
+
+void TokenPump::FollowSilence(int silenceMs) {
+  if (acknowledges_) {
+    check_.OnSilence(silenceMs);
+  } else {
+    labeller_.OnSilence(silenceMs);
+  }
+  frameFirstNs_.reset();
+}
+
+void TokenPump::OnLabelled(const LabelledBytes& labelled) {
+  if (labelled.role == ByteRole::kDropped) {
+    events_->Publish(BytesDropped{NameOf(labelled.reason), labelled.bytes, labelled.afterMs},
+                     recordTimeUs_);
+  } else {
+    frame_ += labelled.bytes;
+  }
+}
+
+void TokenPump::OnCutToken(const CutToken& token) {
+  const std::int64_t firstNs = frameFirstNs_.value_or(recordLastNs_);
+  lineTokens_.push_back({token.bytes, std::exchange(frame_, {}),
+                         std::max<std::int64_t>(recordLastNs_ - firstNs, 0) / kNsPerUs});
+  frameFirstNs_.reset();
+  if (token.endOffset < servedBytes_) {
+    frameFirstNs_ = recordFirstNs_;  // the next frame has begun in the same piece
+  }
+  if (lineTokens_.size() > kMaxLineTokens) {
+    lineTokens_.pop_front();
+  }
+}
+
+void TokenPump::OnFinding(const FramingFinding& finding) {
+  events_->Publish(FindingMade{finding.text, finding.driverBytes, finding.modelBytes});
+}
+
+void TokenPump::OnQueueFull(const CutToken& token) {
+  events_->Publish(BytesDropped{NameOf(DropReason::kQueueFull), token.bytes, 0}, recordTimeUs_);
+}
+
+bool TokenPump::IsHeadPublished() const {
+  return head_ && headVersion_ == requests_->HeadVersion();
+}
+
+std::optional<TokenReceived> TokenPump::Head() const {
+  return IsHeadPublished() ? head_ : std::nullopt;
+}
+
+Answer TokenPump::PublishTokens() {
+  ReceivedToken token;
+  while (!IsHeadPublished()) {
+    const std::uint64_t version = requests_->HeadVersion();
+    const TokenReader::Outcome outcome = reader_.Peek(&token);
+    if (outcome == TokenReader::Outcome::kEmpty) {
+      check_.OnEmptyQueue();
+      return {};
+    }
+    if (outcome == TokenReader::Outcome::kFailed) {
+      return Refusal(reader_.Error());
+    }
+    PublishToken(token);
+    if (!acknowledges_) {
+      headVersion_ = version;
+    } else {
+      head_.reset();
+      if (!reader_.Acknowledge()) {
+        return Refusal(reader_.Error());
+      }
+      check_.OnDriverToken({token.bytes, token.lengthBytes, token.isCut});
+    }
+  }
+  return {};
+}
+
+void TokenPump::PublishToken(const ReceivedToken& token) {
+  TokenReceived detail;
+  detail.number = ++tokenCount_;
+  detail.bytes = token.bytes;
+  detail.lengthBytes = token.lengthBytes;
+  detail.isCut = token.isCut;
+  (void)reader_.CountWaiting(&detail.waiting);
+  AddWhatTheLineKnows(&detail);
+  head_ = detail;
+  events_->Publish(std::move(detail));
+}
+
+// The oldest token of the line with the same bytes; those in front of it never reached a reader.
+void TokenPump::AddWhatTheLineKnows(TokenReceived* token) {
+  const auto found =
+      std::find_if(lineTokens_.begin(), lineTokens_.end(), [&](const LineToken& candidate) {
+        return token->isCut ? candidate.bytes.compare(0, token->bytes.size(), token->bytes) == 0 &&
+                                  candidate.bytes.size() == token->lengthBytes
+                            : candidate.bytes == token->bytes;
+      });
+  if (found != lineTokens_.end()) {
+    token->frame = found->frame;
+    token->durationUs = found->durationUs;
+    lineTokens_.erase(lineTokens_.begin(), found + 1);
+  }
+}

@@ -1,0 +1,82 @@
+// SPDX-License-Identifier: Apache-2.0
+#pragma once
+
+#include <cstdint>
+#include <deque>
+#include <optional>
+#include <string>
+#include <vector>
+
+#include "host/TokenReader.h"
+#include "host/events/HostEvent.h"
+#include "host/framing/FramingCheck.h"
+#include "host/instance/Answer.h"
+#include "host/instance/LineIntake.h"
+
+class EventStream;
+class HostSession;
+class Requests;
+
+// Turns what happened on the line and what the driver has queued into events: bytes as they came,
+// drops with their reason, tokens as the driver's tags show them, and a finding where the driver's
+// token is not the one that the host's own reading of the bytes gives. One thread, which holds the
+// driver's mutex meanwhile.
+class TokenPump final : public CheckSink {
+ public:
+  // All must outlive the pump. `acknowledges`: each token is acknowledged once it is published.
+  // Otherwise that is left to others, and a token is published when it becomes the oldest one; the
+  // pump then does not see every token and compares none.
+  TokenPump(HostSession* session, EventStream* events, const Requests* requests, bool acknowledges);
+
+  // Works off the records, then the driver's queue. Refused when the driver does not let its tokens
+  // be read.
+  Answer Run(const std::vector<LineRecord>& records);
+
+  // Gives the driver's tags back; they are made again when they are needed.
+  void GiveTagsBack() { reader_.GiveTagsBack(); }
+
+  // The published token that is still the oldest one, for those who come later.
+  std::optional<TokenReceived> Head() const;
+
+  void OnLabelled(const LabelledBytes& labelled) override;
+  void OnCutToken(const CutToken& token) override;
+  void OnFinding(const FramingFinding& finding) override;
+  void OnQueueFull(const CutToken& token) override;
+
+ private:
+  // A token as the host read it from the line.
+  struct LineToken {
+    std::string bytes;
+    std::string frame;
+    std::int64_t durationUs = 0;
+  };
+
+  void Follow(const LineRecord& record);
+  void FollowBytes(const LineRecord& record);
+  void FollowSilence(int silenceMs);
+  void FollowSettings();
+  Answer PublishTokens();
+  void PublishToken(const ReceivedToken& token);
+  void AddWhatTheLineKnows(TokenReceived* token);
+  bool IsHeadPublished() const;
+
+  EventStream* const events_;
+  const Requests* const requests_;
+  const bool acknowledges_;
+  TokenReader reader_;
+  FramingCheck check_;     // used when this pump takes the tokens
+  ByteLabeller labeller_;  // used when others do
+  std::uint64_t settingsVersion_ = 0;
+  std::uint64_t tokenCount_ = 0;
+  std::optional<TokenReceived> head_;
+  std::uint64_t headVersion_ = 0;  // Requests::HeadVersion when head_ was read
+
+  // Of the frame that is being read from the line.
+  std::int64_t recordTimeUs_ = 0;
+  std::int64_t recordFirstNs_ = 0;
+  std::int64_t recordLastNs_ = 0;
+  std::uint64_t servedBytes_ = 0;
+  std::optional<std::int64_t> frameFirstNs_;
+  std::string frame_;
+  std::deque<LineToken> lineTokens_;  // cut from the line, not yet met in the driver's queue
+};
