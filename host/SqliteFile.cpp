@@ -203,7 +203,11 @@ bool SqliteFile::Store(const Values& values, std::string* error) {
   if (!Execute("BEGIN IMMEDIATE", error)) {
     return false;
   }
-  if (InsertAll(values) && Execute("COMMIT", error)) {
+  return EndTransaction(InsertAll(values), error);
+}
+
+bool SqliteFile::EndTransaction(bool isGood, std::string* error) {
+  if (isGood && Execute("COMMIT", error)) {
     return true;
   }
   *error = LastErrorText();
@@ -231,6 +235,37 @@ SqliteFile::Values SqliteFile::All(const std::string& ident) {
     }
   }
   return values;
+}
+
+bool SqliteFile::ReadAll(Values* values, std::string* error) {
+  const Statement query = Prepare("SELECT ident, key, kind, value FROM setting");
+  int result = query == nullptr ? SQLITE_ERROR : sqlite3_step(query.get());
+  for (; result == SQLITE_ROW; result = sqlite3_step(query.get())) {
+    (*values)[{ColumnText(query.get(), 0), ColumnText(query.get(), 1)}] =
+        ColumnValue(query.get(), 2, 3);
+  }
+  if (result != SQLITE_DONE) {
+    *error = LastErrorText();
+  }
+  return result == SQLITE_DONE;
+}
+
+bool SqliteFile::DeleteAll(const std::vector<StoredKey>& keys) {
+  const Statement remove = Prepare("DELETE FROM setting WHERE ident = ?1 AND key = ?2");
+  if (remove == nullptr) {
+    return false;
+  }
+  for (const StoredKey& key : keys) {
+    if (!BindText(remove.get(), 1, key.first) || !BindText(remove.get(), 2, key.second) ||
+        sqlite3_step(remove.get()) != SQLITE_DONE || sqlite3_reset(remove.get()) != SQLITE_OK) {
+      return false;
+    }
+  }
+  return true;
+}
+
+bool SqliteFile::Remove(const std::vector<StoredKey>& keys, std::string* error) {
+  return Execute("BEGIN IMMEDIATE", error) && EndTransaction(DeleteAll(keys), error);
 }
 
 std::string SqliteFile::LastErrorText() const {

@@ -39,6 +39,14 @@ class SqliteFile {
   // All keys and values of one key space.
   Values All(const std::string& ident);
 
+  // All keys and values of all key spaces. False, with the reason in `error`, when they cannot all
+  // be read.
+  bool ReadAll(Values* values, std::string* error);
+
+  // Removes keys in one transaction, all of them or none; a key that is not there is none. False,
+  // with the reason in `error`, when nothing was removed. Waits as Store does.
+  bool Remove(const std::vector<StoredKey>& keys, std::string* error);
+
  private:
   struct StatementCloser {
     void operator()(sqlite3_stmt* statement) const;
@@ -55,6 +63,8 @@ class SqliteFile {
   bool CreateTable(std::string* error);
   bool Execute(const char* sql, std::string* error);
   bool InsertAll(const Values& values);
+  bool DeleteAll(const std::vector<StoredKey>& keys);
+  bool EndTransaction(bool isGood, std::string* error);
   Statement Prepare(const char* sql);
   bool QueryText(const char* sql, std::string* answer, std::string* error);
   std::string LastErrorText() const;
