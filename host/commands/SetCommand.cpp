@@ -1,0 +1,161 @@
+// SPDX-License-Identifier: Apache-2.0
+#include "host/commands/SetCommand.h"
+
+#include <CLI/CLI.hpp>
+#include <algorithm>
+
+#include "host/ByteText.h"
+#include "host/Output.h"
+#include "host/Utf8Text.h"
+#include "host/commands/SettingText.h"
+#include "host/commands/SettingWord.h"
+#include "host/commands/TextTable.h"
+#include "host/control/AttachedInstance.h"
+#include "host/events/JsonLine.h"
+#include "host/instance/TrapHints.h"
+
+namespace {
+
+using Json = nlohmann::json;
+
+std::vector<std::string> KeysOf(const std::vector<SettingWord>& settings) {
+  std::vector<std::string> keys;
+  for (const SettingWord& setting : settings) {
+    keys.emplace_back(setting.entry->key);
+  }
+  return keys;
+}
+
+// All words, before the first of them is staged.
+bool ParseWords(const std::vector<std::string>& words, std::vector<SettingWord>* settings,
+                std::string* error) {
+  for (const std::string& word : words) {
+    SettingWord setting;
+    if (!ParseSettingWord(word, &setting, error)) {
+      return false;
+    }
+    const std::vector<std::string> former = KeysOf(*settings);
+    if (std::find(former.begin(), former.end(), setting.entry->key) != former.end()) {
+      *error = std::string(setting.entry->key) + " is given twice";
+      return false;
+    }
+    settings->push_back(std::move(setting));
+  }
+  return true;
+}
+
+// One JSON object a line, or the text.
+bool Print(const SetOptions& options, const Json& data, const std::string& text) {
+  return WriteResult((options.isJson ? JsonLine(data) : text) + "\n");
+}
+
+Answer Stage(Instance* instance, const SetOptions& options,
+             const std::vector<SettingWord>& settings) {
+  Answer answer;
+  SettingRows staged;
+  for (const SettingWord& setting : settings) {
+    answer =
+        instance->Call({{"op", "stage"}, {"key", setting.entry->key}, {"value", setting.tagValue}});
+    if (!answer.IsDone()) {
+      break;
+    }
+    staged.push_back(answer.data);
+  }
+  if (!staged.empty() && !Print(options, {{"staged", staged}}, StagedText(staged))) {
+    answer.status = ExitStatus::kRefused;
+  }
+  return answer;
+}
+
+Answer Apply(Instance* instance, const SetOptions& options,
+             const std::vector<SettingWord>& settings) {
+  Answer answer = instance->Call({{"op", "done"}});
+  if (!answer.IsDone()) {
+    return answer;
+  }
+  if (!options.isJson) {
+    DropClearedHint(&answer);
+  }
+  const std::string others = AlsoAppliedText(answer.data, KeysOf(settings));
+  if (!others.empty()) {
+    answer.hints.push_back("staged before and applied as well: " + others);
+  }
+  if (!Print(options, answer.data, AppliedText(answer.data))) {
+    answer.status = ExitStatus::kRefused;
+  }
+  return answer;
+}
+
+std::string Cell(const Json& row, const char* key) {
+  return row.contains(key) ? PrintableUtf8(row.value(key, "")) : "-";
+}
+
+Answer Show(Instance* instance, const SetOptions& options) {
+  Answer answer = instance->Call({{"op", "settings"}});
+  if (!answer.IsDone()) {
+    return answer;
+  }
+  std::vector<std::vector<std::string>> cells = {
+      {"setting", "configured", "active", "staged", "stored"}};
+  std::string lines;
+  for (const Json& row : answer.data.value("rows", Json::array())) {
+    cells.push_back({Cell(row, "key"), Cell(row, "configured"), Cell(row, "active"),
+                     Cell(row, "staged"), Cell(row, "stored")});
+    lines += JsonLine(row) + "\n";
+    if (row.contains("console")) {
+      answer.hints.push_back(row.value("key", "") + " " + row.value("console", "") +
+                             ", set on the console, is in effect until SP_Done or a restart");
+    }
+  }
+  if (!WriteResult(options.isJson ? lines : TextTable(cells))) {
+    answer.status = ExitStatus::kRefused;
+  }
+  return answer;
+}
+
+int Usage(const std::string& text) {
+  TellUser(PrintableUtf8(text));
+  return static_cast<int>(ExitStatus::kUsage);
+}
+
+}  // namespace
+
+void AddSet(CLI::App* app, SetOptions* options) {
+  CLI::App* const set = app->add_subcommand("set", "Change settings at run time, or show them");
+  CLI::Option* const words =
+      set->add_option("KEY=VALUE", options->words, "Settings to stage and apply")->type_name("");
+  set->add_flag("--stage", options->isStageOnly, "Stage only; SP_Done or a later set applies")
+      ->needs(words);
+  set->add_flag("--show", options->isShown, "Show configured, active, staged and stored values")
+      ->excludes(words);
+  set->add_flag("-j,--json", options->isJson, "One JSON object a line");
+  set->add_flag("-q,--quiet", options->access.isQuiet, "Nothing beside results and refusals");
+  AddInstanceAccess(set, &options->access, false);
+  set->footer("Keys: " + SettingNames() + "\nExample: loka set rx_suffix=CRLF baud=19200");
+}
+
+int RunSet(SetOptions* options) {
+  std::vector<SettingWord> settings;
+  std::string error;
+  if (!ParseWords(options->words, &settings, &error)) {
+    return Usage(error);
+  }
+  options->access.acknowledges = false;
+  options->access.connects = false;
+  Answer answer;
+  const auto instance = OpenInstance(&options->access, &answer);
+  if (instance == nullptr) {
+    return TellAnswer(answer);
+  }
+  if (settings.empty()) {
+    return EndOf(*instance, Show(instance.get(), *options));
+  }
+  answer = Stage(instance.get(), *options, settings);
+  if (answer.IsDone() && !options->isStageOnly) {
+    answer = Apply(instance.get(), *options, settings);
+  } else if (answer.IsDone() && dynamic_cast<AttachedInstance*>(instance.get()) == nullptr) {
+    answer.hints.emplace_back(
+        "no instance is running: what is staged here goes with this command; start loka run first");
+  }
+  return EndOf(*instance, answer);
+}
