@@ -15,11 +15,20 @@
 #include "host/DescribeCommand.h"
 #include "host/ExitStatus.h"
 #include "host/WatchCommand.h"
-#include "host/commands/SimCommand.h"
-#include "host/sim/SimRun.h"
 #include "host/commands/ConfigCommand.h"
+#include "host/commands/ConnectCommand.h"
 #include "host/commands/ExplainCommand.h"
 #include "host/commands/PortsCommand.h"
+#include "host/commands/ReadCommand.h"
+#include "host/commands/RunCommand.h"
+#include "host/commands/SendCommand.h"
+#include "host/commands/SetCommand.h"
+#include "host/commands/SimCommand.h"
+#include "host/commands/StoreCommand.h"
+#include "host/commands/SubCommand.h"
+#include "host/commands/TagsCommand.h"
+#include "host/commands/WriteCommand.h"
+#include "host/sim/SimRun.h"
 
 namespace {
 
@@ -30,13 +39,24 @@ constexpr const char* kExitText =
 
 // Everything that the commands take from the command line.
 struct Arguments {
+  SubOptions sub;
+  SendOptions send;
+  AskOptions ask;
+  RunOptions run;
+  StatsOptions stats;
+  TagsOptions tags;
+  ReadOptions read;
+  WriteOptions write;
+  SetOptions set;
+  StoreOptions store;
+  ConnectOptions connect;
+  ExplainOptions explain;
+  ConfigOptions config;
+  PortsOptions ports;
   InstanceOptions watch;
   CmdOptions cmd;
   std::string cmdPort;
   DescribeOptions describe;
-  ExplainOptions explain;
-  ConfigOptions config;
-  PortsOptions ports;
   SimOptions sim;
   std::string demoPlugin;
   std::string restartedPlugin;
@@ -170,36 +190,69 @@ void AddDemo(CLI::App* app, Arguments* arguments) {
   restarted->add_option("--store", arguments->restartedStore)->required();
 }
 
-int Dispatch(const CLI::App& app, const Arguments& arguments) {
+int Dispatch(const CLI::App& app, Arguments* arguments) {
+  if (app.got_subcommand("sub")) {
+    return RunSub(&arguments->sub);
+  }
+  if (app.got_subcommand("send")) {
+    return RunSend(&arguments->send);
+  }
+  if (app.got_subcommand("ask")) {
+    return RunAsk(&arguments->ask);
+  }
+  if (app.got_subcommand("run")) {
+    return RunRun(&arguments->run);
+  }
+  if (app.got_subcommand("stats")) {
+    return RunStats(&arguments->stats);
+  }
+  if (app.got_subcommand("tags")) {
+    return RunTags(&arguments->tags);
+  }
+  if (app.got_subcommand("read")) {
+    return RunRead(&arguments->read);
+  }
+  if (app.got_subcommand("write")) {
+    return RunWrite(&arguments->write);
+  }
+  if (app.got_subcommand("set")) {
+    return RunSet(&arguments->set);
+  }
+  if (app.got_subcommand("store")) {
+    return RunStore(arguments->store);
+  }
+  if (app.got_subcommand("connect")) {
+    return RunConnect(&arguments->connect);
+  }
   if (app.got_subcommand("watch")) {
-    return RunWatch(arguments.watch);
+    return RunWatch(arguments->watch);
   }
   if (app.got_subcommand("cmd")) {
-    return RunCmd(arguments.cmd);
+    return RunCmd(arguments->cmd);
   }
   if (app.got_subcommand("describe")) {
-    return RunDescribe(arguments.describe);
-  }
-  if (app.got_subcommand("explain")) {
-    return RunExplain(arguments.explain);
-  }
-  if (app.got_subcommand("config")) {
-    return RunConfig(arguments.config);
-  }
-  if (app.got_subcommand("ports")) {
-    return RunPorts(arguments.ports);
+    return RunDescribe(arguments->describe);
   }
   if (app.got_subcommand("sim")) {
-    return RunSim(arguments.sim);
+    return RunSim(arguments->sim);
+  }
+  if (app.got_subcommand("explain")) {
+    return RunExplain(arguments->explain);
+  }
+  if (app.got_subcommand("config")) {
+    return RunConfig(arguments->config);
+  }
+  if (app.got_subcommand("ports")) {
+    return RunPorts(arguments->ports);
   }
   if (app.got_subcommand("demo")) {
-    return RunDemo(arguments.demoPlugin);
+    return RunDemo(arguments->demoPlugin);
   }
   if (app.got_subcommand("demo-device")) {
     return RunDemoDevice();
   }
-  return RunDemoRestarted(arguments.restartedPlugin, arguments.restartedPort,
-                          arguments.restartedStore);
+  return RunDemoRestarted(arguments->restartedPlugin, arguments->restartedPort,
+                          arguments->restartedStore);
 }
 
 }  // namespace
@@ -211,13 +264,24 @@ int RunCommandLine(int argumentCount, const char* const* arguments) {
     app.footer(kExitText);
     app.require_subcommand(0, 1);
     Arguments values;
+    AddSub(&app, &values.sub);
+    AddSend(&app, &values.send);
+    AddAsk(&app, &values.ask);
+    AddRun(&app, &values.run);
+    AddStats(&app, &values.stats);
+    AddTags(&app, &values.tags);
+    AddRead(&app, &values.read);
+    AddWrite(&app, &values.write);
+    AddSet(&app, &values.set);
+    AddStore(&app, &values.store);
+    AddConnect(&app, &values.connect);
     AddWatch(&app, &values);
     AddCmd(&app, &values);
     AddDescribe(&app, &values);
+    AddSim(&app, &values.sim);
     AddExplain(&app, &values.explain);
     AddConfig(&app, &values.config);
     AddPorts(&app, &values.ports);
-    AddSim(&app, &values.sim);
     AddDemo(&app, &values);
     try {
       Parse(&app, {arguments + std::min(argumentCount, 1), arguments + argumentCount}, &values);
@@ -228,7 +292,7 @@ int RunCommandLine(int argumentCount, const char* const* arguments) {
       (void)std::fprintf(stderr, "%s", app.help().c_str());
       return static_cast<int>(ExitStatus::kUsage);
     }
-    return Dispatch(app, values);
+    return Dispatch(app, &values);
   } catch (const std::exception& error) {
     (void)std::fprintf(stderr, "loka: %s\n", error.what());
     return static_cast<int>(ExitStatus::kRefused);
