@@ -6,19 +6,21 @@
 #include <cstdio>
 
 #include "host/ByteText.h"
+#include "host/DescriptionBlock.h"
+#include "host/DescriptionDocument.h"
 #include "host/ExitStatus.h"
 #include "host/HostSession.h"
+#include "host/Output.h"
 #include "host/framing/ConfigEdit.h"
 #include "host/framing/ConfigReport.h"
+#include "host/framing/DocumentDifferences.h"
 #include "interfaces/IProtocol.h"
 #include "interfaces/IProtocol5.h"
 
 namespace {
 
-void Tell(const std::string& text) { (void)std::fprintf(stderr, "loka: %s\n", text.c_str()); }
-
 int Fail(ExitStatus status, const std::string& text) {
-  Tell(text);
+  TellUser(text);
   return static_cast<int>(status);
 }
 
@@ -41,6 +43,22 @@ std::string ComParams(IProtocol* protocol) {
   return text.data();
 }
 
+// What the loaded driver says of itself and this program does not know.
+void TellDocument(const IProtocol* protocol) {
+  DescriptionBlock block;
+  DescriptionDocument document;
+  std::string error = "the driver has no description";
+  const char* const lengthLine = protocol->GetXml();
+  if (lengthLine == nullptr || !ReadDescriptionAt(lengthLine, &block, &error) ||
+      !ParseDescription(block.xml, &document, &error)) {
+    TellUser(error);
+    return;
+  }
+  for (const std::string& difference : DocumentDifferences(document)) {
+    TellUser(difference);
+  }
+}
+
 int Check(const ConfigOptions& options, const std::string& configuration) {
   HostOptions host;
   host.pluginFile = options.pluginFile;
@@ -50,11 +68,12 @@ int Check(const ConfigOptions& options, const std::string& configuration) {
     result = session.Configure(configuration);
   }
   for (const std::string& note : ConfigNotes(configuration)) {
-    Tell(note);
+    TellUser(note);
   }
   if (!result.IsDone()) {
     return Fail(result.status, result.text);
   }
+  TellDocument(session.Protocol());
   (void)std::printf("ok  %s\n", ConfigLine(configuration, ComParams(session.Protocol())).c_str());
   return static_cast<int>(ExitStatus::kDone);
 }
@@ -64,7 +83,7 @@ int Show(const std::string& configuration) {
     (void)std::printf("%s\n", line.c_str());
   }
   for (const std::string& note : ConfigNotes(configuration)) {
-    Tell(note);
+    TellUser(note);
   }
   return static_cast<int>(ExitStatus::kDone);
 }
@@ -72,7 +91,7 @@ int Show(const std::string& configuration) {
 int New(const ConfigOptions& options) {
   const std::string configuration = options.framing.Configuration();
   (void)std::printf("%s\n", configuration.c_str());
-  Tell(ConfigLine(configuration, ""));
+  TellUser(ConfigLine(configuration, ""));
   return static_cast<int>(ExitStatus::kDone);
 }
 

@@ -6,6 +6,7 @@
 
 #include "host/ByteText.h"
 #include "host/ExitStatus.h"
+#include "host/Output.h"
 #include "host/framing/ConfigEdit.h"
 #include "host/framing/ConfigReport.h"
 #include "host/framing/DriverReplay.h"
@@ -14,12 +15,8 @@
 
 namespace {
 
-constexpr int kDifference = 7;
-
-void Tell(const std::string& text) { (void)std::fprintf(stderr, "loka: %s\n", text.c_str()); }
-
 int Fail(ExitStatus status, const std::string& text) {
-  Tell(text);
+  TellUser(text);
   return static_cast<int>(status);
 }
 
@@ -43,13 +40,13 @@ void Play(const LineScript& script, int gapMs, ByteLabeller* labeller) {
 
 void TellHints(const ExplainReport& report, const FramingSettings& settings) {
   for (const DropReason reason : report.Reasons()) {
-    Tell(std::string(NameOf(reason)) + ": " + HintFor(reason));
+    TellUser(std::string(NameOf(reason)) + ": " + HintFor(reason));
   }
   if (report.HasZeroByte() && !settings.isHex) {
-    Tell("a token holds a zero byte: tags show it up to there; --hex shows all of it");
+    TellUser("a token holds a zero byte: tags show it up to there; --hex shows all of it");
   }
-  Tell("tokens " + std::to_string(report.Tokens().size()) + "  dropped " +
-       std::to_string(report.DroppedBytes()) + " bytes");
+  TellUser("tokens " + std::to_string(report.Tokens().size()) + "  dropped " +
+           std::to_string(report.DroppedBytes()) + " bytes");
 }
 
 std::string Shown(const std::vector<std::string>& tokens, std::size_t index) {
@@ -66,12 +63,12 @@ int Check(const ExplainOptions& options, const std::string& configuration, const
   const std::size_t count = std::max(expected.size(), replay.tokens.size());
   for (std::size_t i = 0; i < count; ++i) {
     if (i >= expected.size() || i >= replay.tokens.size() || expected[i] != replay.tokens[i]) {
-      Tell("finding: token " + std::to_string(i + 1) + " of the driver is " +
-           Shown(replay.tokens, i) + ", expected " + Shown(expected, i));
-      return kDifference;
+      TellUser("finding: token " + std::to_string(i + 1) + " of the driver is " +
+               Shown(replay.tokens, i) + ", expected " + Shown(expected, i));
+      return static_cast<int>(ExitStatus::kDifference);
     }
   }
-  Tell("checked: " + replay.pluginPath + " cuts the same " + std::to_string(count) + " tokens");
+  TellUser("checked: " + replay.pluginPath + " cuts the same " + std::to_string(count) + " tokens");
   return static_cast<int>(ExitStatus::kDone);
 }
 
@@ -125,7 +122,7 @@ int RunExplain(const ExplainOptions& options) {
     return Fail(ExitStatus::kUsage, error);
   }
   const FramingSettings settings = FramingOfConfiguration(configuration);
-  Tell(ReceivingText(settings));
+  TellUser(ReceivingText(settings));
   ExplainReport report(options.isJson, TextStyle(options.colour),
                        [](const std::string& line) { (void)std::printf("%s\n", line.c_str()); });
   ByteLabeller labeller(settings, &report);

@@ -33,7 +33,7 @@ void ExpectExampleRuns(const Words& command) {
   }
   ChildProcess shell("/bin/sh", {"sh", "-c",
                                  "export LOKA_PLUGIN='" + PluginLibrary::DefaultPath() + "'; " +
-                                     line + " 2>/dev/null",
+                                     "{ " + line + "; } 2>/dev/null",
                                  program});
   std::string first;
   EXPECT_TRUE(shell.ReadLine(Deadline::After(ProgramRun::kLimitMs), &first)) << line;
