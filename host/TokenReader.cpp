@@ -94,6 +94,15 @@ bool TokenReader::ReadStable(std::string* text, unsigned int* length) {
   return false;
 }
 
+bool TokenReader::ReadHexMode(bool* isHex) {
+  unsigned int number = 0;
+  if (!hexMode_ && !ReadNumber(*hexTag_, &number)) {
+    return false;
+  }
+  *isHex = hexMode_.value_or(number != 0);
+  return true;
+}
+
 TokenReader::Outcome TokenReader::Peek(ReceivedToken* token) {
   unsigned int waiting = 0;
   if (!CountWaiting(&waiting)) {
@@ -102,16 +111,16 @@ TokenReader::Outcome TokenReader::Peek(ReceivedToken* token) {
   if (waiting == 0) {
     return Outcome::kEmpty;
   }
-  unsigned int isHex = 0;
+  bool isHex = false;
   std::string text;
   unsigned int length = 0;
-  if (!ReadNumber(*hexTag_, &isHex) || !ReadStable(&text, &length)) {
+  if (!ReadHexMode(&isHex) || !ReadStable(&text, &length)) {
     return Outcome::kFailed;
   }
   token->isCut = text.size() < length;
   token->lengthBytes = length;
   // A token that was queued before hex mode was switched on is still plain.
-  if (isHex != 0 && !token->isCut && ParseHexBytes(text, &token->bytes)) {
+  if (isHex && !token->isCut && ParseHexBytes(text, &token->bytes)) {
     token->lengthBytes = static_cast<unsigned int>(token->bytes.size());
   } else {
     token->bytes = text;

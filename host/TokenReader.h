@@ -2,6 +2,7 @@
 #pragma once
 
 #include <memory>
+#include <optional>
 #include <string>
 
 class HostSession;
@@ -43,6 +44,11 @@ class TokenReader {
   // Tokens that wait; false when the driver refuses.
   bool CountWaiting(unsigned int* count);
 
+  // Whether tokens are hexadecimal text from now on. Who knows what the driver runs with says it
+  // here; the driver's tag, which is asked otherwise, shows what is staged and not what is in
+  // effect.
+  void SetHexMode(bool isHex) { hexMode_ = isHex; }
+
   // Frees the tags that the reader keeps; the next call makes them again.
   void GiveTagsBack();
 
@@ -51,6 +57,7 @@ class TokenReader {
 
  private:
   bool Prepare();
+  bool ReadHexMode(bool* isHex);
   std::unique_ptr<HostTag> MakeTag(const std::string& uri);
   bool ReadNumber(const HostTag& tag, unsigned int* value);
   bool MakeRoom(unsigned int lengthCharacters);
@@ -62,6 +69,7 @@ class TokenReader {
   std::unique_ptr<HostTag> hexTag_;
   std::unique_ptr<HostTag> acknowledgeTag_;
   std::unique_ptr<HostTag> tokenTag_;
+  std::optional<bool> hexMode_;
   unsigned int roomCharacters_ = 0;  // longest text that tokenTag_ can read
   std::string error_;
 };

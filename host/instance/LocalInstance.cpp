@@ -120,7 +120,7 @@ Answer LocalInstance::Subscribe() { return {}; }
 
 // Of another process, on the server's thread.
 Answer LocalInstance::HandleShared(const nlohmann::json& request) {
-  if (request.value("op", nlohmann::json()) != "subscribe") {
+  if (!request.contains("op") || request["op"] != "subscribe") {
     Answer answer = requests_->Handle(request);
     intake_.Wake();  // another token may be the oldest one now
     return answer;

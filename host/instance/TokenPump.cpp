@@ -24,7 +24,9 @@ TokenPump::TokenPump(HostSession* session, EventStream* events, const Requests* 
       reader_(session),
       check_(requests->Framing(), this),
       labeller_(requests->Framing(), this),
-      settingsVersion_(requests->SettingsVersion()) {}
+      settingsVersion_(requests->SettingsVersion()) {
+  reader_.SetHexMode(requests->Framing().isHex);
+}
 
 Answer TokenPump::Run(const std::vector<LineRecord>& records) {
   FollowSettings();
@@ -41,6 +43,7 @@ void TokenPump::FollowSettings() {
     settingsVersion_ = version;
     check_.ChangeSettings(requests_->Framing());
     labeller_.ChangeSettings(requests_->Framing());
+    reader_.SetHexMode(requests_->Framing().isHex);
     lineTokens_.clear();
   }
 }
