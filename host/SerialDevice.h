@@ -5,6 +5,7 @@
 #include <memory>
 #include <mutex>
 #include <string>
+#include <utility>
 #include <vector>
 
 #include "host/LineSettings.h"
@@ -68,8 +69,8 @@ class SerialDevice {
   void MarkLost() { isLost_ = true; }
 
  private:
-  SerialDevice(int fileDescriptor, const PortOptions& options, const TerminalCalls& calls)
-      : fileDescriptor_(fileDescriptor), options_(options), calls_(calls) {}
+  SerialDevice(int fileDescriptor, PortOptions options, const TerminalCalls& calls)
+      : fileDescriptor_(fileDescriptor), options_(std::move(options)), calls_(calls) {}
 
   bool MakeRaw() const;
   bool SetLine(const termios& line) const;

@@ -108,6 +108,7 @@ std::vector<std::string> DescribePorts(const std::vector<ListedPort>& ports, boo
 
 std::vector<std::string> PortsAsJson(const std::vector<ListedPort>& ports) {
   std::vector<std::string> lines;
+  lines.reserve(ports.size());
   for (const ListedPort& port : ports) {
     // An adapter may call itself anything; what is not UTF-8 is replaced.
     lines.push_back(

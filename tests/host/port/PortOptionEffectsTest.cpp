@@ -27,7 +27,7 @@ class PortOptionEffectsTest : public testing::Test {
     ASSERT_NE(device, nullptr) << problem.text;
     port_ = std::make_unique<PosixSerialPort>(std::move(device), options, &observer_, calls_);
   }
-  int Setup(int mode) { return port_->Setup(9600, 0, 8, 1, mode); }
+  int SetLine(int mode) { return port_->Setup(9600, 0, 8, 1, mode); }
   int Send(const std::string& bytes) {
     return port_->Send(reinterpret_cast<const unsigned char*>(bytes.data()),
                        static_cast<int>(bytes.size()), 0);
@@ -55,7 +55,7 @@ class PortOptionEffectsTest : public testing::Test {
 
 TEST_F(PortOptionEffectsTest, TouchesNoModemLineUnlessAsked) {
   Open("");
-  EXPECT_EQ(Setup(kModeRs232), 1);
+  EXPECT_EQ(SetLine(kModeRs232), 1);
   EXPECT_EQ(calls_.asked, Calls{});
   EXPECT_EQ(calls_.line.c_cflag & CRTSCTS, 0U);
 }
@@ -76,12 +76,12 @@ TEST_F(PortOptionEffectsTest, SaysWhenALineHasNoModemLines) {
 
 TEST_F(PortOptionEffectsTest, FlowControlAndClosingStandInTheLine) {
   Open(",flow=rtscts,hupcl=off");
-  ASSERT_EQ(Setup(kModeRs232), 1);
+  ASSERT_EQ(SetLine(kModeRs232), 1);
   EXPECT_NE(calls_.line.c_cflag & CRTSCTS, 0U);
   EXPECT_EQ(calls_.line.c_cflag & HUPCL, 0U);
   port_.reset();
   Open(",flow=xonxoff,hupcl=on");
-  ASSERT_EQ(Setup(kModeRs232), 1);
+  ASSERT_EQ(SetLine(kModeRs232), 1);
   EXPECT_EQ(calls_.line.c_cflag & CRTSCTS, 0U);
   EXPECT_EQ(calls_.line.c_iflag & (IXON | IXOFF), static_cast<tcflag_t>(IXON | IXOFF));
   EXPECT_EQ(calls_.line.c_cc[VSTART], 0x11);
@@ -91,40 +91,40 @@ TEST_F(PortOptionEffectsTest, FlowControlAndClosingStandInTheLine) {
 
 TEST_F(PortOptionEffectsTest, Rs485IsLeftToTheKernelWhereItCan) {
   Open("");
-  EXPECT_EQ(Setup(kModeRs485), 1);
+  EXPECT_EQ(SetLine(kModeRs485), 1);
   EXPECT_EQ(calls_.asked, Calls{"rs485 on"});
   EXPECT_TRUE(observer_.Notes().empty());
-  EXPECT_EQ(Setup(kModeRs232), 1);
+  EXPECT_EQ(SetLine(kModeRs232), 1);
   EXPECT_EQ(calls_.asked, (Calls{"rs485 on", "rs485 off"}));
 }
 
 TEST_F(PortOptionEffectsTest, Rs485AutoGoesOnWithANoteAndIoctlInsists) {
   calls_.hasRs485 = false;
   Open(",rs485=auto");
-  EXPECT_EQ(Setup(kModeRs485), 1);
+  EXPECT_EQ(SetLine(kModeRs485), 1);
   EXPECT_EQ(observer_.Notes().size(), 1U);
   port_.reset();
   Open(",rs485=ioctl");
-  EXPECT_EQ(Setup(kModeRs485), 0);
+  EXPECT_EQ(SetLine(kModeRs485), 0);
   EXPECT_EQ(port_->LastSetupError(),
             "rs485=ioctl: the kernel cannot control the RS-485 direction of this port");
   // A line without a direction does not need it.
-  EXPECT_EQ(Setup(kModeRs422), 1);
+  EXPECT_EQ(SetLine(kModeRs422), 1);
 }
 
 TEST_F(PortOptionEffectsTest, Rs485OffNeverAsks) {
   Open(",rs485=off");
-  EXPECT_EQ(Setup(kModeRs485), 1);
+  EXPECT_EQ(SetLine(kModeRs485), 1);
   EXPECT_EQ(calls_.asked, Calls{});
 }
 
 TEST_F(PortOptionEffectsTest, Rs485RtsIsOnAroundEachSend) {
   Open(",rs485=rts");
-  ASSERT_EQ(Setup(kModeRs485), 1);
+  ASSERT_EQ(SetLine(kModeRs485), 1);
   EXPECT_EQ(calls_.asked, Calls{"rts-"});
   EXPECT_EQ(Send("abc"), 3);
   EXPECT_EQ(calls_.asked, (Calls{"rts-", "rts+", "drain", "rts-"}));
-  ASSERT_EQ(Setup(kModeRs232), 1);
+  ASSERT_EQ(SetLine(kModeRs232), 1);
   EXPECT_EQ(Send("d"), 1);
   EXPECT_EQ(calls_.asked.size(), 4U);
   EXPECT_EQ(Sent(4), "abcd");
@@ -133,7 +133,7 @@ TEST_F(PortOptionEffectsTest, Rs485RtsIsOnAroundEachSend) {
 TEST_F(PortOptionEffectsTest, Rs485RtsNeedsAnRtsLine) {
   calls_.hasModemLines = false;
   Open(",rs485=rts");
-  EXPECT_EQ(Setup(kModeRs485), 0);
+  EXPECT_EQ(SetLine(kModeRs485), 0);
   EXPECT_EQ(port_->LastSetupError().rfind("rs485=rts: the line cannot switch RTS", 0), 0U);
 }
 
@@ -178,7 +178,7 @@ TEST_F(PortOptionEffectsTest, LineWithoutCountersSaysSo) {
 
 TEST_F(PortOptionEffectsTest, EchoIsTakenOutAndCounted) {
   Open(",echo=strip");
-  ASSERT_EQ(Setup(kModeRs485), 1);
+  ASSERT_EQ(SetLine(kModeRs485), 1);
   ASSERT_EQ(Send("query"), 5);
   ASSERT_EQ(Sent(5), "query");
   ASSERT_TRUE(line_.Send("queryanswer", Deadline::After(kLimitMs)));
@@ -199,7 +199,7 @@ TEST_F(PortOptionEffectsTest, EchoIsTakenOutAndCounted) {
 TEST_F(PortOptionEffectsTest, BytesAreSentOneByOneWithADelay) {
   constexpr int kDelayMs = 5;
   Open(",txdelay=" + std::to_string(kDelayMs));
-  ASSERT_EQ(Setup(kModeRs232), 1);
+  ASSERT_EQ(SetLine(kModeRs232), 1);
   const Deadline earliest = Deadline::After(2 * kDelayMs);
   EXPECT_EQ(Send("abc"), 3);
   EXPECT_TRUE(earliest.HasPassed());
