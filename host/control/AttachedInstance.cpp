@@ -22,7 +22,7 @@ namespace {
 
 using Json = nlohmann::json;
 
-constexpr std::size_t kMaxLineBytes = 16U * 1024U * 1024U;
+constexpr std::size_t kMaxLineBytes = std::size_t{16} * 1024 * 1024;
 // Long enough for a request that waits for a port with the longest usual gap.
 constexpr int kAnswerLimitMs = 60 * 1000;
 
@@ -163,7 +163,7 @@ Answer AttachedInstance::Subscribe() {
 
 Answer AttachedInstance::Serve(EventSink* sink, const std::function<bool()>& isDone,
                                const Deadline& deadline) {
-  const Answer subscribed = Subscribe();
+  Answer subscribed = Subscribe();
   if (!subscribed.IsDone()) {
     return subscribed;
   }

@@ -26,7 +26,7 @@ std::string FromEnvironment(const char* name) {
 }  // namespace
 
 std::string ControlFolder() {
-  const std::string own = FromEnvironment("LOKA_RUNTIME_DIR");
+  std::string own = FromEnvironment("LOKA_RUNTIME_DIR");
   if (!own.empty()) {
     return own;
   }

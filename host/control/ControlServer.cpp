@@ -29,8 +29,8 @@ namespace {
 
 using Json = nlohmann::json;
 
-constexpr std::size_t kMaxRequestBytes = 1024U * 1024U;
-constexpr std::size_t kMaxWaitingBytes = 1024U * 1024U;  // of events, for one client
+constexpr std::size_t kMaxRequestBytes = std::size_t{1024} * 1024;
+constexpr std::size_t kMaxWaitingBytes = std::size_t{1024} * 1024;  // of events, for one client
 constexpr int kBacklog = 16;
 constexpr std::size_t kMaxClients = 64;
 

@@ -5,6 +5,7 @@
 
 #include <array>
 #include <cstdio>
+#include <cstdlib>
 #include <ctime>
 
 namespace {
@@ -26,7 +27,7 @@ std::int64_t WallClockUs() {
 }
 
 std::string UtcText(std::int64_t timeUs) {
-  const std::time_t seconds = static_cast<std::time_t>(SecondsOf(timeUs));
+  const auto seconds = static_cast<std::time_t>(SecondsOf(timeUs));
   const auto restUs = static_cast<long>(timeUs - SecondsOf(timeUs) * kUsPerSecond);
   tm utc{};
   (void)gmtime_r(&seconds, &utc);
@@ -38,7 +39,7 @@ std::string UtcText(std::int64_t timeUs) {
 }
 
 std::string LocalTimeText(std::int64_t timeUs) {
-  const std::time_t seconds = static_cast<std::time_t>(SecondsOf(timeUs));
+  const auto seconds = static_cast<std::time_t>(SecondsOf(timeUs));
   const auto restMs = static_cast<long>((timeUs - SecondsOf(timeUs) * kUsPerSecond) / 1000);
   tm local{};
   (void)localtime_r(&seconds, &local);
@@ -50,18 +51,14 @@ std::string LocalTimeText(std::int64_t timeUs) {
 
 bool ParseUtcText(const std::string& text, std::int64_t* timeUs) {
   tm utc{};
-  long restUs = 0;
-  int used = 0;
-  const int fields =
-      std::sscanf(text.c_str(), "%4d-%2d-%2dT%2d:%2d:%2d.%6ldZ%n", &utc.tm_year, &utc.tm_mon,
-                  &utc.tm_mday, &utc.tm_hour, &utc.tm_min, &utc.tm_sec, &restUs, &used);
-  if (fields != 7 || static_cast<std::size_t>(used) != text.size()) {
+  // The part behind the point is read on its own: strptime(3) knows no fractions.
+  const char* const point = strptime(text.c_str(), "%Y-%m-%dT%H:%M:%S", &utc);
+  if (point == nullptr || *point != '.') {
     return false;
   }
-  utc.tm_year -= 1900;
-  utc.tm_mon -= 1;
+  const long restUs = std::strtol(point + 1, nullptr, 10);
   const std::int64_t parsed = static_cast<std::int64_t>(timegm(&utc)) * kUsPerSecond + restUs;
-  // Only one way to write a moment is taken: no missing digits, no 13th month.
+  // Only one way to write a moment is taken: no missing digits, no 31st of November.
   if (UtcText(parsed) != text) {
     return false;
   }

@@ -11,7 +11,7 @@ namespace {
 
 // What may wait for a serving thread that is busy. Beyond it bytes are counted, not kept: the
 // driver has them all the same.
-constexpr std::size_t kMaxKeptBytes = 8U * 1024U * 1024U;
+constexpr std::size_t kMaxKeptBytes = std::size_t{8} * 1024 * 1024;
 constexpr std::int64_t kNsPerUs = 1000;
 
 std::int64_t MonotonicNs() {
