@@ -169,8 +169,8 @@ Answer Requests::Handle(const Json& request) {
 Answer Requests::Dispatch(const std::string& op, const Json& request) {
   using Handler = Answer (Requests::*)(const Json&);
   struct Operation {
-    const char* name;
-    Handler handler;
+    const char* name = nullptr;
+    Handler handler = nullptr;
     RequestKeys keys;
   };
   static const std::array<Operation, 13> kOperations = {{
@@ -305,7 +305,7 @@ Answer Requests::HandleWrite(const Json& request) {
   if (memoryType == "connect") {
     // The driver takes what is no change of the state as a token to send.
     if (answer.IsDone() && wasConnected && IsConnected()) {
-      answer.hints.push_back(kHintConnectTwice);
+      answer.hints.emplace_back(kHintConnectTwice);
     }
     ExplainConnect(wasConnected, &answer);
     NoteConnection(wasConnected);
@@ -439,7 +439,7 @@ Answer Requests::HandleSend(const Json& request) {
     value = CompactHex(bytes);
   } else if (bytes.find('\0') != std::string::npos) {
     Answer answer = Refusal("a plain token ends at its first zero byte", ExitStatus::kUsage);
-    answer.hints.push_back(kHintHexTokens);
+    answer.hints.emplace_back(kHintHexTokens);
     return answer;
   }
   Answer answer = Write("0?tx_token?string-" + std::to_string(value.size() + 1), value);
