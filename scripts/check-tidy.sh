@@ -7,6 +7,7 @@
 
 cd "$project_dir"
 [ -f build/asan/compile_commands.json ] || cmake --preset asan >/dev/null
+cmake --build --preset asan --target loka_description >/dev/null
 if [ $# -gt 0 ]; then
   files=("$@")
 else
