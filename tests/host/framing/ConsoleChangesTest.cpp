@@ -52,7 +52,7 @@ std::vector<std::string> DriverTokens(const LineScript& script, const Changes& c
     const HostTag available(protocol, protocol->CreateTag("0?tokens_available?unsignedInt"),
                             nullptr);
     const HostTag token(protocol, protocol->CreateTag("0?rx_token?string-2100"), nullptr);
-    const HostTag acknowledge(protocol, protocol->CreateTag("0?token_ack?boolean"), nullptr);
+    HostTag acknowledge(protocol, protocol->CreateTag("0?token_ack?boolean"), nullptr);
     unsigned int left = 0;
     EXPECT_TRUE(available.ReadNumber(&left));
     for (; left > 0; --left) {
