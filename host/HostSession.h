@@ -78,6 +78,12 @@ class HostSession {
   // The path behind a port name; empty when there is none.
   std::string PathOf(const std::string& portName) const { return options_.ports.PathFor(portName); }
 
+  // The counts of the configured port, and whether it is lost for good (see PosixSerialFactory).
+  PortCounters CountersFor(const std::string& portName) const {
+    return serialFactory_.CountersFor(portName);
+  }
+  bool IsPortGone(const std::string& portName) const { return serialFactory_.IsGone(portName); }
+
   // Why a port could not be opened or set up the last time (see PosixSerialFactory::LastProblem).
   PortProblem LastPortProblem() const { return serialFactory_.LastProblem(); }
 

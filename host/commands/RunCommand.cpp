@@ -50,6 +50,12 @@ void PrintStats(const nlohmann::json& data) {
   }
   std::string text = "tokens " + CountText(data, "tokens");
   text += "  dropped " + std::to_string(dropCount) + (drops.empty() ? "" : " (" + drops + ")");
+  if (data.contains("line_errors")) {
+    const nlohmann::json& errors = data["line_errors"];
+    text += "  framing errors " + CountText(errors, "framing");
+    text += "  parity errors " + CountText(errors, "parity");
+    text += "  overruns " + CountText(errors, "overruns");
+  }
   text += "  lost sends " + CountText(data, "lost_sends");
   text += "  reconnects " + CountText(data, "reconnects");
   text += "  findings " + CountText(data, "findings");

@@ -92,10 +92,18 @@ void LineIntake::OnSent(std::string_view bytes, std::size_t takenBytes) {
 }
 
 void LineIntake::OnLineLost(const std::string& path, const std::string& why, int errorNumber) {
+  AddLoss(path + ": line lost (" + why + "); waiting for it to come back", errorNumber);
+}
+
+void LineIntake::OnLineGone(const std::string& path, const std::string& why, int errorNumber) {
+  AddLoss(path + ": line lost (" + why + ")", errorNumber);
+}
+
+void LineIntake::AddLoss(const std::string& text, int errorNumber) {
   LineRecord record;
   record.kind = LineRecord::Kind::kLost;
   record.timeUs = WallClockUs();
-  record.text = path + ": line lost (" + why + "); waiting for it to come back";
+  record.text = text;
   record.errorNumber = errorNumber;
   Add(std::move(record));
 }

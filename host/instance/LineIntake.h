@@ -37,6 +37,7 @@ class LineIntake final : public PortObserver {
   void OnSilence(int timeoutMs) override;
   void OnSent(std::string_view bytes, std::size_t takenBytes) override;
   void OnLineLost(const std::string& path, const std::string& why, int errorNumber) override;
+  void OnLineGone(const std::string& path, const std::string& why, int errorNumber) override;
   void OnLineBack(const std::string& path) override;
   void OnPortNote(const std::string& text) override;
 
@@ -53,6 +54,7 @@ class LineIntake final : public PortObserver {
 
  private:
   void Add(LineRecord record);
+  void AddLoss(const std::string& text, int errorNumber);
 
   mutable std::mutex mutex_;
   std::condition_variable changed_;

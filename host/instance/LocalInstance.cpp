@@ -152,6 +152,9 @@ Answer LocalInstance::Serve(EventSink* sink, const std::function<bool()>& isDone
       return Refusal("", ExitStatus::kTimeout);
     }
     Answer answer = Pump(deadline);
+    if (answer.IsDone() && session_.IsPortGone(Port())) {
+      answer = Refusal("the line is lost and reconnect=off", ExitStatus::kPortLost);
+    }
     if (!answer.IsDone()) {
       return answer;
     }

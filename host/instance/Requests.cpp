@@ -559,5 +559,16 @@ Answer Requests::HandleConnect(const Json& request) {
 Answer Requests::HandleStats(const Json& /*request*/) {
   Answer answer;
   answer.data = statistics_->ToJson();
+  const PortCounters counters = session_->CountersFor(events_->Port());
+  answer.data["lost_send_bytes"] = counters.lostSendBytes;
+  answer.data["lost_ms"] = counters.lostMs;
+  answer.data["echo_mismatches"] = counters.echoMismatches;
+  if (counters.lineErrors.areKnown) {
+    answer.data["line_errors"] = {{"framing", counters.lineErrors.framing},
+                                  {"parity", counters.lineErrors.parity},
+                                  {"overruns", counters.lineErrors.overruns},
+                                  {"breaks", counters.lineErrors.breaks},
+                                  {"buffer_overruns", counters.lineErrors.bufferOverruns}};
+  }
   return answer;
 }

@@ -35,7 +35,8 @@ class Statistics;
 //   stage      key, value                key, value, active
 //   done                                 applied (key, value, previous), stored, cleared, as does
 //                                        a write to SP_Done
-//   stats                                as Statistics writes them
+//   stats                                as Statistics writes them; lost_send_bytes, lost_ms,
+//                                        echo_mismatches, line_errors (where the line counts)
 //   connect    state: on, off or status  connected, changed
 //
 // Values, lines and replies may hold any byte and travel as hexadecimal digits, except the values
