@@ -155,7 +155,7 @@ void NoteWords(const std::string& configuration, Notes* notes) {
 
 bool OverlapsItself(const std::string& text) {
   for (std::size_t shift = 1; shift < text.size(); ++shift) {
-    if (text.compare(shift, text.npos, text, 0, text.size() - shift) == 0) {
+    if (text.compare(shift, std::string::npos, text, 0, text.size() - shift) == 0) {
       return true;
     }
   }

@@ -18,6 +18,7 @@ class App;
 class FramingFlags {
  public:
   FramingFlags() = default;
+  ~FramingFlags() = default;
 
   // The options refer to this object.
   FramingFlags(const FramingFlags&) = delete;
