@@ -65,7 +65,7 @@ TEST_P(EventJsonTest, IsReadBack) {
 }
 
 INSTANTIATE_TEST_SUITE_P(Kinds, EventJsonTest, testing::ValuesIn(Cases()),
-                         [](const auto& info) { return std::string(info.param.name); });
+                         [](const auto& entry) { return std::string(entry.param.name); });
 
 TEST(EventJsonBytesTest, EveryByteSurvivesAndTheLineIsPlainAscii) {
   std::string bytes;
