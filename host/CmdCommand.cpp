@@ -7,11 +7,13 @@
 #include <cstdio>
 #include <string_view>
 
+#include "host/ByteText.h"
 #include "host/ExitStatus.h"
 #include "host/HostEvents.h"
 #include "host/Output.h"
 #include "host/SessionConsole.h"
 #include "host/Utf8Text.h"
+#include "host/commands/InstanceAccess.h"
 
 namespace {
 
@@ -26,6 +28,12 @@ bool NeedsPort(const std::string& line) {
   const std::string word = CommandWord(line);
   return std::find(std::begin(kCommandsWithoutPort), std::end(kCommandsWithoutPort), word) ==
          std::end(kCommandsWithoutPort);
+}
+
+// What every driver of this kind answers in the same way, whatever it does.
+bool DescribesDriver(const std::string& line) {
+  const std::string word = CommandWord(line);
+  return word == "help" || word == "xml" || word == "getmaxtm";
 }
 
 std::string Join(const std::vector<std::string>& words) {
@@ -50,9 +58,8 @@ std::string ForStream(const ConsoleReply& reply, int fileDescriptor) {
   return text;
 }
 
-// Runs the command and shows the reply.
-int Answer(Console* console, const std::string& line) {
-  const ConsoleReply reply = console->Run(line);
+// Returns the exit status of the program.
+int ShowReply(const ConsoleReply& reply, const std::string& line) {
   if (reply.isCut) {
     TellUser("the reply is cut after " + std::to_string(reply.text.size()) + " bytes");
   }
@@ -81,7 +88,34 @@ int RunWithoutPort(const InstanceOptions& options, const std::string& line) {
     TellUser("'" + CommandWord(line) + "' needs no port: none is opened, nothing is configured");
   }
   SessionConsole console(&session);
-  return Answer(&console, line);
+  return ShowReply(console.Run(line), line);
+}
+
+// The command goes to the driver of another process; what it does there is told as well.
+int RunAttached(Instance* instance, const std::string& line) {
+  Answer answer = instance->Call({{"op", "console"}, {"line", CompactHex(line)}});
+  ConsoleReply reply;
+  const std::string hexReply = answer.data.value("reply", "-");
+  if (!ParseHexBytes(hexReply, &reply.text)) {
+    return EndOf(*instance, answer);
+  }
+  reply.isDone = answer.IsDone();
+  reply.isCut = answer.data.value("cut", false);
+  const int status = ShowReply(reply, line);
+  for (const std::string& hint : answer.hints) {
+    TellUser(hint);
+  }
+  return status;
+}
+
+// Null when there is none; then `answer` says whether that is a failure.
+std::unique_ptr<Instance> FindRunning(const CmdOptions& options, Answer* answer) {
+  InstanceAccess access;
+  access.options = options.instance;
+  access.configSource = options.instance.configuration;
+  access.instanceName = options.instanceName;
+  access.isAttachWanted = !options.instanceName.empty();
+  return AttachInstance(access, answer);
 }
 
 int RunOnPort(const InstanceOptions& options, const std::string& line) {
@@ -109,7 +143,7 @@ int RunOnPort(const InstanceOptions& options, const std::string& line) {
   TellUser("started for this command only:");
   TellSettings(options, host, &session);
   SessionConsole console(&session);
-  return Answer(&console, line);
+  return ShowReply(console.Run(line), line);
 }
 
 }  // namespace
@@ -119,12 +153,26 @@ int RunCmd(const CmdOptions& options) {
   if (line.empty()) {
     return UsageError("a console command is missing; loka cmd help lists them");
   }
+  if (options.isAttachRefused && !options.instanceName.empty()) {
+    return UsageError("--instance and --no-attach contradict each other");
+  }
+  if (!DescribesDriver(line) && !options.isAttachRefused) {
+    Answer answer;
+    const auto running = FindRunning(options, &answer);
+    if (running != nullptr) {
+      return RunAttached(running.get(), line);
+    }
+    if (!answer.IsDone()) {
+      return TellAnswer(answer);
+    }
+  }
   if (!NeedsPort(line)) {
     return RunWithoutPort(options.instance, line);
   }
   if (options.instance.portWords.empty() || options.instance.configuration.empty()) {
     return UsageError("'" + PrintableUtf8(CommandWord(line)) +
-                      "' needs a port and --config; only help, info, xml, lasterror, getmaxtm and "
+                      "' needs a running instance, or a port and --config; only help, info, xml, "
+                      "lasterror, getmaxtm and "
                       "deletetags do without");
   }
   return RunOnPort(options.instance, line);

@@ -105,8 +105,10 @@ void AddCmd(CLI::App* app, Arguments* arguments) {
       ->type_name("")
       ->expected(-1);
   AddInstance(cmd, &arguments->cmd.instance, false);
-  cmd->footer(std::string("Example: loka cmd /dev/ttyUSB0 --config \"$CONFIG\" put hello world\n"
-                          "         loka cmd help\n") +
+  cmd->add_option("--instance", arguments->cmd.instanceName, "Running instance, by its port")
+      ->type_name("NAME");
+  cmd->add_flag("--no-attach", arguments->cmd.isAttachRefused, "Never with a running instance");
+  cmd->footer(std::string("Example: loka cmd /dev/ttyUSB0 --config \"$CONFIG\" put hello world\n") +
               kExitText);
 }
 

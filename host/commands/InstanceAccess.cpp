@@ -53,6 +53,11 @@ void TellAttached(const InstanceAccess& access, const AttachedInstance& instance
   if (access.framing.IsGiven() || !access.configSource.empty()) {
     TellUser("its own configuration holds; that of the command line is left out");
   }
+  const InstanceOptions& options = access.options;
+  if (options.withoutStore || !options.storeFile.empty() || !options.ident.empty() ||
+      !options.pluginFile.empty()) {
+    TellUser("its own plug-in and store hold; those of the command line are left out");
+  }
 }
 
 std::string Join(const std::vector<std::string>& words) {
@@ -63,8 +68,9 @@ std::string Join(const std::vector<std::string>& words) {
   return text;
 }
 
-// The running instance, or null: then `answer` says whether that is a failure.
-std::unique_ptr<Instance> Attach(const InstanceAccess& access, Answer* answer) {
+}  // namespace
+
+std::unique_ptr<Instance> AttachInstance(const InstanceAccess& access, Answer* answer) {
   std::vector<std::unique_ptr<AttachedInstance>> found;
   std::vector<std::string> foundNames;
   for (const std::string& name : Candidates(access)) {
@@ -93,8 +99,6 @@ std::unique_ptr<Instance> Attach(const InstanceAccess& access, Answer* answer) {
   TellAttached(access, *found.front());
   return std::move(found.front());
 }
-
-}  // namespace
 
 void AddInstanceAccess(CLI::App* command, InstanceAccess* access, bool hasPortWord) {
   InstanceOptions& options = access->options;
@@ -155,7 +159,7 @@ std::unique_ptr<Instance> OpenInstance(InstanceAccess* access, Answer* answer) {
     return nullptr;
   }
   if (!access->isAttachRefused) {
-    auto attached = Attach(*access, answer);
+    auto attached = AttachInstance(*access, answer);
     if (attached != nullptr || !answer->IsDone()) {
       return attached;
     }

@@ -41,6 +41,10 @@ bool Resolve(InstanceAccess* access, Answer* answer);
 // runs with. Null with the reason in `answer`.
 std::unique_ptr<Instance> OpenInstance(InstanceAccess* access, Answer* answer);
 
+// The first half of OpenInstance alone: the running instance, told on standard error, or null; then
+// `answer` says whether that is a failure.
+std::unique_ptr<Instance> AttachInstance(const InstanceAccess& access, Answer* answer);
+
 // The second half of OpenInstance alone: always an instance of its own.
 std::unique_ptr<LocalInstance> BeginInstance(const InstanceAccess& access, Answer* answer);
 

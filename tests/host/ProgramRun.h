@@ -13,7 +13,8 @@
 #include "tests/host/TemporaryFolder.h"
 #include "tests/support/PluginLibrary.h"
 
-// A run of the program with the plug-in of this build and a store folder of its own.
+// A run of the program with the plug-in of this build, and with a store folder and a folder of
+// control sockets of its own. `environment` can name others: the last one counts.
 class ProgramRun {
  public:
   static constexpr int kLimitMs = 30000;
@@ -22,8 +23,9 @@ class ProgramRun {
                       const std::string& environment = "") {
     // The shell takes care of stderr and the environment.
     const std::string script = "exec env -u NO_COLOR LOKA_PLUGIN='" + PluginLibrary::DefaultPath() +
-                               "' XDG_STATE_HOME='" + folder_.Path().string() + "' " + environment +
-                               " \"$0\" \"$@\" 2>'" + folder_.File("stderr") + "'";
+                               "' XDG_STATE_HOME='" + folder_.Path().string() +
+                               "' LOKA_RUNTIME_DIR='" + folder_.File("control") + "' " +
+                               environment + " \"$0\" \"$@\" 2>'" + folder_.File("stderr") + "'";
     std::vector<std::string> all = {"sh", "-c", script, LOKA_PROGRAM_PATH};
     all.insert(all.end(), arguments.begin(), arguments.end());
     process_ = std::make_unique<ChildProcess>("/bin/sh", all);
