@@ -49,6 +49,11 @@ class InstanceRun {
     return result;
   }
 
+  // A command that goes on while the test does something.
+  std::unique_ptr<ProgramRun> Begin(const std::vector<std::string>& arguments) const {
+    return std::make_unique<ProgramRun>(arguments, Environment());
+  }
+
   // What the command prints, for one that succeeds.
   std::string Output(const std::vector<std::string>& arguments) const {
     const Result result = Loka(arguments);
