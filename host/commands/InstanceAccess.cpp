@@ -92,7 +92,7 @@ std::unique_ptr<Instance> AttachInstance(const InstanceAccess& access, Answer* a
       *answer = Refusal(access.options.portWords.empty() ? "no instance is running"
                                                          : "no instance is running on this port",
                         ExitStatus::kPort);
-      answer->hints.push_back("loka run starts one");
+      answer->hints.emplace_back("loka run starts one");
     }
     return nullptr;
   }
@@ -170,7 +170,8 @@ std::unique_ptr<Instance> OpenInstance(InstanceAccess* access, Answer* answer) {
 std::unique_ptr<LocalInstance> BeginInstance(const InstanceAccess& access, Answer* answer) {
   if (access.options.configuration.empty()) {
     *answer = Refusal("no configuration and no running instance", ExitStatus::kUsage);
-    answer->hints.push_back("give --config FILE or framing flags with a port, or start loka run");
+    answer->hints.emplace_back(
+        "give --config FILE or framing flags with a port, or start loka run");
     return nullptr;
   }
   auto instance =

@@ -20,6 +20,7 @@ using Json = nlohmann::json;
 
 std::vector<std::string> KeysOf(const std::vector<SettingWord>& settings) {
   std::vector<std::string> keys;
+  keys.reserve(settings.size());
   for (const SettingWord& setting : settings) {
     keys.emplace_back(setting.entry->key);
   }

@@ -30,7 +30,7 @@ constexpr const char* kKeepsText =
     "the running driver keeps its cached values until it is restarted";
 // Unless an identifier is given, the driver's instance has the name of its port.
 constexpr const char* kUsualIdent = "com1";
-constexpr std::size_t kMaxImportBytes = 1024U * 1024U;
+constexpr std::size_t kMaxImportBytes = std::size_t{1024} * 1024;
 
 struct Failure {
   ExitStatus status = ExitStatus::kDone;
@@ -206,8 +206,8 @@ std::string JsonLinesOf(const Values& values, const std::string& ident) {
 int List(const StoreOptions& options, const Store& store) {
   std::set<std::string> idents = store.Idents();
   if (!options.ident.empty()) {
-    idents = idents.count(options.ident) == 0 ? std::set<std::string>()
-                                              : std::set<std::string>{options.ident};
+    idents = idents.contains(options.ident) ? std::set<std::string>{options.ident}
+                                            : std::set<std::string>();
   }
   if (idents.empty()) {
     TellUser("nothing is stored in " + store.Path());
@@ -228,9 +228,9 @@ bool FindKeys(const StoreOptions& options, const Store& store, const std::string
   for (const std::string& word : options.words) {
     const SettingEntry* const setting = FindSetting(word);
     const StoredKey plain = {ident, word};
-    const bool isPlain = store.All().count(plain) != 0;
+    const bool isPlain = store.All().contains(plain);
     const StoredKey key = isPlain || setting == nullptr ? plain : StoredKey(ident, setting->key);
-    if (store.All().count(key) == 0) {
+    if (!store.All().contains(key)) {
       *error = word + " is not stored";
       return false;
     }

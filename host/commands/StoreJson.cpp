@@ -85,11 +85,13 @@ bool ParseSpace(const std::string& ident, const Json& space, SqliteFile::Values*
     StoredValue value;
     const SettingEntry* const setting = FindSetting(key);
     if (!ValueOf(json, &value)) {
-      *error = key + " of " + ident + " is no number of 32 bits, no boolean and no text";
+      error->assign(key).append(" of ").append(ident);
+      error->append(" is no number of 32 bits, no boolean and no text");
       return false;
     }
     if (setting != nullptr && key == setting->key && !HasItsKind(*setting, value)) {
-      *error = key + " of " + ident + " must be " + KindName(setting->form);
+      error->assign(key).append(" of ").append(ident);
+      error->append(" must be ").append(KindName(setting->form));
       return false;
     }
     (*values)[{ident, key}] = std::move(value);
