@@ -3,6 +3,7 @@
 
 #include <mutex>
 #include <string>
+#include <utility>
 #include <vector>
 
 #include "host/events/EventSink.h"
@@ -12,6 +13,7 @@
 class EventStream {
  public:
   explicit EventStream(std::string port) : port_(std::move(port)) {}
+  ~EventStream() = default;
 
   EventStream(const EventStream&) = delete;
   EventStream& operator=(const EventStream&) = delete;

@@ -135,10 +135,10 @@ Answer LocalInstance::HandleShared(const nlohmann::json& request) {
   return answer;
 }
 
-Answer LocalInstance::Pump(const Deadline& deadline) {
+Answer LocalInstance::Pump(const Deadline& deadline, const std::function<bool()>& isDone) {
   const std::vector<LineRecord> records = intake_.Take(deadline);
   const std::lock_guard<std::mutex> lock(requests_->DriverMutex());
-  return pump_->Run(records);
+  return pump_->Run(records, isDone);
 }
 
 Answer LocalInstance::Serve(EventSink* sink, const std::function<bool()>& isDone,
@@ -151,7 +151,8 @@ Answer LocalInstance::Serve(EventSink* sink, const std::function<bool()>& isDone
     if (deadline.HasPassed()) {
       return Refusal("", ExitStatus::kTimeout);
     }
-    Answer answer = Pump(deadline);
+    // A device that never pauses must not keep a signal waiting.
+    Answer answer = Pump(deadline, [&] { return isDone() || StopSignal() != 0; });
     if (answer.IsDone() && session_.IsPortGone(Port())) {
       answer = Refusal("the line is lost and reconnect=off", ExitStatus::kPortLost);
     }

@@ -1,6 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #pragma once
 
+#include <functional>
 #include <memory>
 #include <string>
 
@@ -53,7 +54,7 @@ class LocalInstance final : public Instance {
   Answer Start(const Options& options);
   Answer Connect();
   Answer HandleShared(const nlohmann::json& request);
-  Answer Pump(const Deadline& deadline);
+  Answer Pump(const Deadline& deadline, const std::function<bool()>& isDone);
 
   LineIntake intake_;
   SignalWatch signals_;  // in front of everything that starts threads

@@ -28,12 +28,12 @@ TokenPump::TokenPump(HostSession* session, EventStream* events, const Requests* 
   reader_.SetHexMode(requests->Framing().isHex);
 }
 
-Answer TokenPump::Run(const std::vector<LineRecord>& records) {
+Answer TokenPump::Run(const std::vector<LineRecord>& records, const std::function<bool()>& isDone) {
   FollowSettings();
   for (const LineRecord& record : records) {
     Follow(record);
   }
-  return PublishTokens();
+  return PublishTokens(isDone);
 }
 
 // Settings change behind everything that the driver was given before.
@@ -135,9 +135,9 @@ std::optional<TokenReceived> TokenPump::Head() const {
   return IsHeadPublished() ? head_ : std::nullopt;
 }
 
-Answer TokenPump::PublishTokens() {
+Answer TokenPump::PublishTokens(const std::function<bool()>& isDone) {
   ReceivedToken token;
-  while (!IsHeadPublished()) {
+  while (!IsHeadPublished() && !isDone()) {
     const std::uint64_t version = requests_->HeadVersion();
     const TokenReader::Outcome outcome = reader_.Peek(&token);
     if (outcome == TokenReader::Outcome::kEmpty) {

@@ -3,6 +3,7 @@
 
 #include <cstdint>
 #include <deque>
+#include <functional>
 #include <optional>
 #include <string>
 #include <vector>
@@ -28,9 +29,10 @@ class TokenPump final : public CheckSink {
   // pump then does not see every token and compares none.
   TokenPump(HostSession* session, EventStream* events, const Requests* requests, bool acknowledges);
 
-  // Works off the records, then the driver's queue. Refused when the driver does not let its tokens
-  // be read.
-  Answer Run(const std::vector<LineRecord>& records);
+  // Works off the records, then the driver's queue until isDone, asked in front of each token, says
+  // so: what nobody wants any more stays in the queue. Refused when the driver does not let its
+  // tokens be read.
+  Answer Run(const std::vector<LineRecord>& records, const std::function<bool()>& isDone);
 
   // Gives the driver's tags back; they are made again when they are needed.
   void GiveTagsBack() { reader_.GiveTagsBack(); }
@@ -55,7 +57,7 @@ class TokenPump final : public CheckSink {
   void FollowBytes(const LineRecord& record);
   void FollowSilence(int silenceMs);
   void FollowSettings();
-  Answer PublishTokens();
+  Answer PublishTokens(const std::function<bool()>& isDone);
   void PublishToken(const ReceivedToken& token);
   void AddWhatTheLineKnows(TokenReceived* token);
   bool IsHeadPublished() const;
