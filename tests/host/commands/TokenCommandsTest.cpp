@@ -178,7 +178,7 @@ TEST(StatsCommand, CountsTokensAndDrops) {
                            "B\x03"
                            "C",
                            Limit()));
-  const Deadline deadline = Deadline::After(ProgramRun::Limit() Ms);
+  const Deadline deadline = Deadline::After(ProgramRun::kLimitMs);
   Json counts = Json::object();
   while (counts.value("tokens", 0) < 2 || counts.value("dropped_bytes", 0) < 1) {
     ASSERT_FALSE(deadline.HasPassed()) << counts;
