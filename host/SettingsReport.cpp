@@ -3,80 +3,15 @@
 
 #include <algorithm>
 #include <array>
-#include <cctype>
-#include <cstdlib>
 
 #include "host/ConfigText.h"
 #include "host/HostSession.h"
 #include "host/LineSettings.h"
+#include "host/instance/SettingTable.h"
 
 namespace {
 
-constexpr std::array<const char*, 5> kParityNames = {"none", "even", "odd", "mark", "space"};
-constexpr std::array<const char*, 4> kModeNames = {"RS-232", "RS-485", "RS-422", "RS-485P"};
 constexpr unsigned int kDefaultGapMs = 500;
-
-enum class Form { kNumber, kParity, kMode, kHexText, kBoolean };
-
-// A setting under its name in the storage and its key and default in the configuration.
-struct Setting {
-  const char* storedKey;
-  const char* configKey;
-  const char* fallback;
-  Form form;
-};
-
-constexpr std::array<Setting, 12> kSettings = {
-    {{"baud", "baudrate", "0", Form::kNumber},
-     {"parity", "parity", "none", Form::kParity},
-     {"bits", "bits", "0", Form::kNumber},
-     {"stop", "stopbits", "0", Form::kNumber},
-     {"mode", "mode", "RS-232", Form::kMode},
-     {"rx_prefix", "rx_prefix", "", Form::kHexText},
-     {"rx_suffix", "rx_suffix", "", Form::kHexText},
-     {"tx_prefix", "tx_prefix", "", Form::kHexText},
-     {"tx_suffix", "tx_suffix", "", Form::kHexText},
-     {"gap", "gap", "0", Form::kNumber},
-     {"hex_tokens", "hex_tokens", "false", Form::kBoolean},
-     {"token_queue_size", "token_queue_size", "100", Form::kNumber}}};
-
-template <std::size_t count>
-std::string NameOf(const std::array<const char*, count>& names, int code) {
-  const auto index = static_cast<std::size_t>(code);
-  return index < count ? names[index] : std::to_string(code);
-}
-
-// Hexadecimal text in one spelling: upper case, and "none" for the empty text.
-std::string NormalHexText(const std::string& text) {
-  if (text.empty() || text == "none") {
-    return "none";
-  }
-  std::string result = text;
-  std::transform(result.begin(), result.end(), result.begin(),
-                 [](unsigned char c) { return static_cast<char>(std::toupper(c)); });
-  return result;
-}
-
-std::string ShowStored(const StoredValue& value, Form form) {
-  if (const auto* const text = std::get_if<std::string>(&value)) {
-    return form == Form::kHexText ? NormalHexText(*text) : *text;
-  }
-  if (const auto* const flag = std::get_if<bool>(&value)) {
-    return *flag ? "true" : "false";
-  }
-  const int number = std::get<int>(value);
-  if (form == Form::kParity) {
-    return NameOf(kParityNames, number);
-  }
-  return form == Form::kMode ? NameOf(kModeNames, number) : std::to_string(number);
-}
-
-std::string ShowConfigured(const std::string& text, Form form) {
-  if (form == Form::kNumber) {
-    return std::to_string(std::strtol(text.c_str(), nullptr, 0));
-  }
-  return form == Form::kHexText ? NormalHexText(text) : text;
-}
 
 bool ReadNumber(HostSession* session, const std::string& name, const char* type,
                 unsigned int* value) {
@@ -89,7 +24,8 @@ std::string ReadHexText(HostSession* session, const std::string& name) {
   std::string error;
   std::string text;
   const auto tag = session->CreateTag("0?" + name + "?string-4096", &error);
-  return tag != nullptr && tag->ReadText(&text) ? NormalHexText(text) : "?";
+  return tag != nullptr && tag->ReadText(&text) ? ShowSetting(*FindSettingOfMemoryType(name), text)
+                                                : "?";
 }
 
 bool ReadLineSettings(HostSession* session, LineSettings* settings) {
@@ -144,18 +80,18 @@ std::vector<std::string> DescribeSettings(HostSession* session, const std::strin
 std::vector<std::string> DescribeOverrides(const std::string& configuration,
                                            const SqliteFile::Values& stored) {
   std::vector<std::string> lines;
-  for (const Setting& setting : kSettings) {
+  for (const SettingEntry& setting : kSettingTable) {
     const auto found = std::find_if(stored.begin(), stored.end(), [&](const auto& entry) {
-      return entry.first.second == setting.storedKey;
+      return entry.first.second == setting.key;
     });
     if (found == stored.end()) {
       continue;
     }
-    const std::string active = ShowStored(found->second, setting.form);
-    const std::string configured = ShowConfigured(
-        ConfigValue(configuration, setting.configKey, setting.fallback), setting.form);
+    const std::string active = ShowStored(setting, found->second);
+    const std::string configured =
+        ShowConfigured(setting, ConfigValue(configuration, setting.configKey, setting.fallback));
     if (active != configured) {
-      lines.push_back(std::string("stored override: ") + setting.storedKey + " " + active +
+      lines.push_back(std::string("stored override: ") + setting.key + " " + active +
                       " instead of " + configured);
     }
   }
