@@ -20,6 +20,7 @@ class ArrivalQueue {
  public:
   // Roughly what a queue may hold, the overhead of small blocks included.
   explicit ArrivalQueue(std::size_t limitBytes) : limitBytes_(limitBytes) {}
+  ~ArrivalQueue() = default;
 
   ArrivalQueue(const ArrivalQueue&) = delete;
   ArrivalQueue& operator=(const ArrivalQueue&) = delete;
