@@ -3,6 +3,7 @@
 
 #include <algorithm>
 #include <array>
+#include <utility>
 
 #include "host/ConfigText.h"
 #include "host/HostSession.h"
@@ -91,8 +92,10 @@ std::vector<std::string> DescribeOverrides(const std::string& configuration,
     const std::string configured =
         ShowConfigured(setting, ConfigValue(configuration, setting.configKey, setting.fallback));
     if (active != configured) {
-      lines.push_back(std::string("stored override: ") + setting.key + " " + active +
-                      " instead of " + configured);
+      std::string line = std::string("stored override: ") + setting.key;
+      line += " " + active;
+      line += " instead of " + configured;
+      lines.push_back(std::move(line));
     }
   }
   return lines;

@@ -6,6 +6,7 @@
 #include <sys/stat.h>
 #include <unistd.h>
 
+#include <algorithm>
 #include <cerrno>
 #include <filesystem>
 #include <system_error>
@@ -189,14 +190,12 @@ bool SqliteFile::InsertAll(const Values& values) {
   if (insert == nullptr) {
     return false;
   }
-  for (const auto& [key, value] : values) {
-    if (!BindText(insert.get(), 1, key.first) || !BindText(insert.get(), 2, key.second) ||
-        !BindValue(insert.get(), 3, 4, value) || sqlite3_step(insert.get()) != SQLITE_DONE ||
-        sqlite3_reset(insert.get()) != SQLITE_OK) {
-      return false;
-    }
-  }
-  return true;
+  return std::all_of(values.begin(), values.end(), [&](const auto& entry) {
+    const auto& [key, value] = entry;
+    return BindText(insert.get(), 1, key.first) && BindText(insert.get(), 2, key.second) &&
+           BindValue(insert.get(), 3, 4, value) && sqlite3_step(insert.get()) == SQLITE_DONE &&
+           sqlite3_reset(insert.get()) == SQLITE_OK;
+  });
 }
 
 bool SqliteFile::Store(const Values& values, std::string* error) {
@@ -255,13 +254,10 @@ bool SqliteFile::DeleteAll(const std::vector<StoredKey>& keys) {
   if (remove == nullptr) {
     return false;
   }
-  for (const StoredKey& key : keys) {
-    if (!BindText(remove.get(), 1, key.first) || !BindText(remove.get(), 2, key.second) ||
-        sqlite3_step(remove.get()) != SQLITE_DONE || sqlite3_reset(remove.get()) != SQLITE_OK) {
-      return false;
-    }
-  }
-  return true;
+  return std::all_of(keys.begin(), keys.end(), [&](const StoredKey& key) {
+    return BindText(remove.get(), 1, key.first) && BindText(remove.get(), 2, key.second) &&
+           sqlite3_step(remove.get()) == SQLITE_DONE && sqlite3_reset(remove.get()) == SQLITE_OK;
+  });
 }
 
 bool SqliteFile::Remove(const std::vector<StoredKey>& keys, std::string* error) {

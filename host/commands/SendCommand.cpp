@@ -13,7 +13,7 @@
 
 namespace {
 
-constexpr std::size_t kMaxPayloadBytes = 256U * 1024U;
+constexpr std::size_t kMaxPayloadBytes = std::size_t{256} * 1024;
 
 Answer SendBytes(Instance* instance, const std::string& bytes) {
   return instance->Call({{"op", "send"}, {"hex", CompactHex(bytes)}});

@@ -11,15 +11,15 @@
 
 // One kind of simulated device with what is usual for it.
 struct DeviceKind {
-  const char* name;
-  const char* summary;      // one line
-  const char* description;  // what it sends and what it answers, for the help
+  const char* name = "";
+  const char* summary = "";      // one line
+  const char* description = "";  // what it sends and what it answers, for the help
   DeviceFraming framing;
-  int everyMs;  // between two messages; 0: speaks only when it is asked
+  int everyMs = 0;  // between two messages; 0: speaks only when it is asked
   LineSettings line;
   DeviceFraming commands;  // what a host should put around what it sends
-  int gapMs;               // the gap that suits a host, 0 for the usual one
-  std::unique_ptr<Device> (*make)(const DeviceSettings& settings);
+  int gapMs = 0;           // the gap that suits a host, 0 for the usual one
+  std::unique_ptr<Device> (*make)(const DeviceSettings& settings) = nullptr;
 };
 
 // All kinds, in the order of the help. Any thread.
