@@ -58,7 +58,8 @@ TEST(CmdProgram, SaysWhatACommandNeeds) {
     ProgramRun run(words);
     EXPECT_EQ(run.Output(), "");
     EXPECT_EQ(run.Status(), 2);
-    EXPECT_TRUE(Holds(run.Errors(), "'get_stat' needs a running instance, or a port and --config")) << run.Errors();
+    EXPECT_TRUE(Holds(run.Errors(), "'get_stat' needs a running instance, or a port and --config"))
+        << run.Errors();
   }
 }
 
