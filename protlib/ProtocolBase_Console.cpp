@@ -1,6 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
 #include <algorithm>
-#include <cstring>
 #include <memory>
 
 #include "interfaces/IMultiTask2.h"
@@ -115,7 +114,7 @@ int ProtocolBase::GetInfo(char* buffer, int sizeBytes) const {
   return Guarded(0, [&] {
     const std::string text = InfoText(*this);
     const std::size_t length = std::min(text.size(), static_cast<std::size_t>(sizeBytes));
-    std::memcpy(buffer, text.data(), length);
+    std::copy_n(text.data(), length, buffer);  // no terminating zero is wanted
     return static_cast<int>(length);
   });
 }
