@@ -11,6 +11,8 @@
 
 namespace {
 
+constexpr int kLineWaitStepMs = 5;
+
 Answer AnswerOf(const HostResult& result) {
   Answer answer = Refusal(result.text, result.status);
   if (result.status == ExitStatus::kPort) {
@@ -136,7 +138,9 @@ Answer LocalInstance::HandleShared(const nlohmann::json& request) {
 }
 
 Answer LocalInstance::Pump(const Deadline& deadline, const std::function<bool()>& isDone) {
-  const std::vector<LineRecord> records = intake_.Take(deadline);
+  const std::vector<LineRecord> records = intake_.Take(
+      pump_->IsWaitingForLine() ? Deadline::Earlier(deadline, Deadline::After(kLineWaitStepMs))
+                                : deadline);
   const std::lock_guard<std::mutex> lock(requests_->DriverMutex());
   return pump_->Run(records, isDone);
 }

@@ -13,6 +13,7 @@ namespace {
 // More of the line's tokens than any queue of the driver holds are not worth keeping.
 constexpr std::size_t kMaxLineTokens = 20000;
 constexpr std::int64_t kNsPerUs = 1000;
+constexpr int kLineWaitMs = 50;
 
 }  // namespace
 
@@ -141,12 +142,17 @@ Answer TokenPump::PublishTokens(const std::function<bool()>& isDone) {
     const std::uint64_t version = requests_->HeadVersion();
     const TokenReader::Outcome outcome = reader_.Peek(&token);
     if (outcome == TokenReader::Outcome::kEmpty) {
+      lineWait_.reset();
       check_.OnEmptyQueue();
       return {};
     }
     if (outcome == TokenReader::Outcome::kFailed) {
       return Refusal(reader_.Error());
     }
+    if (MustWaitForLine(token)) {
+      return {};
+    }
+    lineWait_.reset();
     PublishToken(token);
     if (!acknowledges_) {
       headVersion_ = version;
@@ -168,22 +174,38 @@ void TokenPump::PublishToken(const ReceivedToken& token) {
   detail.lengthBytes = token.lengthBytes;
   detail.isCut = token.isCut;
   (void)reader_.CountWaiting(&detail.waiting);
-  AddWhatTheLineKnows(&detail);
+  AddWhatTheLineKnows(token, &detail);
   head_ = detail;
   events_->Publish(std::move(detail));
 }
 
-// The oldest token of the line with the same bytes; those in front of it never reached a reader.
-void TokenPump::AddWhatTheLineKnows(TokenReceived* token) {
-  const auto found =
-      std::find_if(lineTokens_.begin(), lineTokens_.end(), [&](const LineToken& candidate) {
-        return token->isCut ? candidate.bytes.compare(0, token->bytes.size(), token->bytes) == 0 &&
-                                  candidate.bytes.size() == token->lengthBytes
-                            : candidate.bytes == token->bytes;
-      });
+// The oldest token of the line with the same bytes.
+std::deque<TokenPump::LineToken>::iterator TokenPump::FindOnLine(const ReceivedToken& token) {
+  return std::find_if(lineTokens_.begin(), lineTokens_.end(), [&](const LineToken& candidate) {
+    return token.isCut ? candidate.bytes.compare(0, token.bytes.size(), token.bytes) == 0 &&
+                             candidate.bytes.size() == token.lengthBytes
+                       : candidate.bytes == token.bytes;
+  });
+}
+
+// For a moment only: a token that the host reads differently never shows up on the line.
+bool TokenPump::MustWaitForLine(const ReceivedToken& token) {
+  if (FindOnLine(token) != lineTokens_.end()) {
+    lineWait_.reset();
+    return false;
+  }
+  if (!lineWait_) {
+    lineWait_ = Deadline::After(kLineWaitMs);
+  }
+  return !lineWait_->HasPassed();
+}
+
+// Tokens of the line in front of this one never reached a reader.
+void TokenPump::AddWhatTheLineKnows(const ReceivedToken& token, TokenReceived* detail) {
+  const auto found = FindOnLine(token);
   if (found != lineTokens_.end()) {
-    token->frame = found->frame;
-    token->durationUs = found->durationUs;
+    detail->frame = found->frame;
+    detail->durationUs = found->durationUs;
     lineTokens_.erase(lineTokens_.begin(), found + 1);
   }
 }

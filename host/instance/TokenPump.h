@@ -8,6 +8,7 @@
 #include <string>
 #include <vector>
 
+#include "host/Deadline.h"
 #include "host/TokenReader.h"
 #include "host/events/HostEvent.h"
 #include "host/framing/FramingCheck.h"
@@ -34,6 +35,10 @@ class TokenPump final : public CheckSink {
   // tokens be read.
   Answer Run(const std::vector<LineRecord>& records, const std::function<bool()>& isDone);
 
+  // The driver has queued a token whose bytes are not among the records yet: it tells the port that
+  // it took them when it asks for the next one. Run should be called again soon.
+  bool IsWaitingForLine() const { return lineWait_.has_value(); }
+
   // Gives the driver's tags back; they are made again when they are needed.
   void GiveTagsBack() { reader_.GiveTagsBack(); }
 
@@ -59,7 +64,9 @@ class TokenPump final : public CheckSink {
   void FollowSettings();
   Answer PublishTokens(const std::function<bool()>& isDone);
   void PublishToken(const ReceivedToken& token);
-  void AddWhatTheLineKnows(TokenReceived* token);
+  std::deque<LineToken>::iterator FindOnLine(const ReceivedToken& token);
+  bool MustWaitForLine(const ReceivedToken& token);
+  void AddWhatTheLineKnows(const ReceivedToken& token, TokenReceived* detail);
   bool IsHeadPublished() const;
 
   EventStream* const events_;
@@ -80,5 +87,6 @@ class TokenPump final : public CheckSink {
   std::uint64_t servedBytes_ = 0;
   std::optional<std::int64_t> frameFirstNs_;
   std::string frame_;
+  std::optional<Deadline> lineWait_;
   std::deque<LineToken> lineTokens_;  // cut from the line, not yet met in the driver's queue
 };
