@@ -34,8 +34,8 @@ namespace {
 
 constexpr const char* kVersion = "loka 1.0.0";
 constexpr const char* kExitText =
-    "Exit status: 0 done, 1 refused by the driver, 2 usage, 3 plug-in, 4 configuration,\n"
-    "5 port, 128+n ended by signal n. Results go to stdout, everything else to stderr.";
+    "Exit status: 0 done, 1 refused, 2 usage, 3 plug-in, 4 configuration, 5 port,\n"
+    "6 line gone, 7 difference, 27 not in time, 128+n signal n. Results go to stdout.";
 
 // Everything that the commands take from the command line.
 struct Arguments {
