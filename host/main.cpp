@@ -1,4 +1,4 @@
 // SPDX-License-Identifier: Apache-2.0
-#include "host/CommandLine.h"
+#include "host/commands/CommandLine.h"
 
 int main(int argumentCount, char** arguments) { return RunCommandLine(argumentCount, arguments); }

@@ -5,15 +5,15 @@
 #include <array>
 #include <cstdio>
 
-#include "host/ByteText.h"
-#include "host/DescriptionBlock.h"
-#include "host/DescriptionDocument.h"
-#include "host/ExitStatus.h"
-#include "host/HostSession.h"
-#include "host/Output.h"
+#include "host/base/ExitStatus.h"
+#include "host/document/DescriptionBlock.h"
+#include "host/document/DescriptionDocument.h"
 #include "host/framing/ConfigEdit.h"
 #include "host/framing/ConfigReport.h"
 #include "host/framing/DocumentDifferences.h"
+#include "host/runtime/HostSession.h"
+#include "host/text/ByteText.h"
+#include "host/text/Output.h"
 #include "interfaces/IProtocol.h"
 #include "interfaces/IProtocol5.h"
 

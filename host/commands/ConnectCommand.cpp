@@ -3,8 +3,8 @@
 
 #include <CLI/CLI.hpp>
 
-#include "host/Output.h"
 #include "host/events/JsonLine.h"
+#include "host/text/Output.h"
 
 namespace {
 
@@ -23,7 +23,6 @@ void AddConnect(CLI::App* app, ConnectOptions* options) {
       ->required()
       ->check(CLI::IsMember({"on", "off", "status"}).description(""));
   connect->add_flag("-j,--json", options->isJson, "As a JSON object");
-  connect->add_flag("-q,--quiet", options->access.isQuiet, "Nothing beside the state");
   AddInstanceAccess(connect, &options->access, false);
   connect->footer("Example: loka connect status");
 }

@@ -1,14 +1,14 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "host/commands/EventPrinter.h"
 
-#include "host/ByteText.h"
-#include "host/Output.h"
 #include "host/events/EventJson.h"
 #include "host/events/EventText.h"
 #include "host/events/HexDump.h"
 #include "host/events/WallClock.h"
 #include "host/framing/ByteRole.h"
 #include "host/instance/TrapHints.h"
+#include "host/text/ByteText.h"
+#include "host/text/Output.h"
 
 namespace {
 

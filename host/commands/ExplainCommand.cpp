@@ -4,14 +4,14 @@
 #include <CLI/CLI.hpp>
 #include <cstdio>
 
-#include "host/ByteText.h"
-#include "host/ExitStatus.h"
-#include "host/Output.h"
+#include "host/base/ExitStatus.h"
 #include "host/framing/ConfigEdit.h"
 #include "host/framing/ConfigReport.h"
 #include "host/framing/DriverReplay.h"
 #include "host/framing/ExplainReport.h"
 #include "host/framing/LineScript.h"
+#include "host/text/ByteText.h"
+#include "host/text/Output.h"
 
 namespace {
 

@@ -8,12 +8,12 @@
 #include <utility>
 #include <vector>
 
-#include "host/Output.h"
-#include "host/Utf8Text.h"
 #include "host/control/AttachedInstance.h"
 #include "host/control/ControlPath.h"
 #include "host/framing/ConfigEdit.h"
 #include "host/instance/LocalInstance.h"
+#include "host/text/Output.h"
+#include "host/text/Utf8Text.h"
 
 namespace {
 
@@ -68,6 +68,49 @@ std::string Join(const std::vector<std::string>& words) {
   return text;
 }
 
+void AddPortAndStore(CLI::App* command, InstanceAccess* access) {
+  constexpr const char* kGroup = "Port and driver";
+  InstanceOptions& options = access->options;
+  command->add_option("--port", options.portWords, "As PORT; may be given more than once")
+      ->type_name("PORT")
+      ->expected(1)
+      ->take_all()
+      ->group(kGroup);
+  command
+      ->add_option("-c,--config", access->configSource,
+                   "Configuration: a file, - for standard input, or the text itself")
+      ->type_name("CONFIG")
+      ->group(kGroup);
+  CLI::Option* const store =
+      command->add_option("--store", options.storeFile, "File with the stored settings")
+          ->type_name("FILE")
+          ->group(kGroup);
+  command->add_flag("--no-store", options.withoutStore, "Neither use nor keep stored settings")
+      ->excludes(store)
+      ->group(kGroup);
+  command->add_option("--ident", options.ident, "Whose stored settings (else the port name)")
+      ->type_name("NAME")
+      ->group(kGroup);
+  command
+      ->add_option("--plugin", options.pluginFile,
+                   "Driver to load (else $LOKA_PLUGIN, else beside loka)")
+      ->type_name("FILE")
+      ->group(kGroup);
+}
+
+void AddAttaching(CLI::App* command, InstanceAccess* access) {
+  constexpr const char* kGroup = "Running instance";
+  command->add_option("--instance", access->instanceName, "Which one to attach to, by its port")
+      ->type_name("NAME")
+      ->group(kGroup);
+  CLI::Option* const attach =
+      command->add_flag("--attach", access->isAttachWanted, "Only with a running instance")
+          ->group(kGroup);
+  command->add_flag("--no-attach", access->isAttachRefused, "Never with a running instance")
+      ->excludes(attach)
+      ->group(kGroup);
+}
+
 }  // namespace
 
 std::unique_ptr<Instance> AttachInstance(const InstanceAccess& access, Answer* answer) {
@@ -101,38 +144,17 @@ std::unique_ptr<Instance> AttachInstance(const InstanceAccess& access, Answer* a
 }
 
 void AddInstanceAccess(CLI::App* command, InstanceAccess* access, bool hasPortWord) {
-  InstanceOptions& options = access->options;
   if (hasPortWord) {
     command->add_option("PORT", access->portWord, "Port to open: a path or comN=PATH[,OPTION...]")
         ->type_name("");
   }
-  command->add_option("--port", options.portWords, "The same; may be given more than once")
-      ->type_name("PORT")
-      ->expected(1)
-      ->take_all();
-  command
-      ->add_option("-c,--config", access->configSource,
-                   "Configuration: a file, - for standard input, or the text itself")
-      ->type_name("CONFIG");
+  CLI::Option* const quiet =
+      command->add_flag("-q,--quiet", access->isQuiet, "Nothing beside results and refusals");
+  command->add_flag("-v,--verbose", access->verbosity, "More on standard error; -vv: every byte")
+      ->excludes(quiet);
+  AddPortAndStore(command, access);
+  AddAttaching(command, access);
   access->framing.AddAll(command);
-  CLI::Option* const store =
-      command->add_option("--store", options.storeFile, "File with the stored settings")
-          ->type_name("FILE");
-  command->add_flag("--no-store", options.withoutStore, "Neither use nor keep stored settings")
-      ->excludes(store);
-  command->add_option("--ident", options.ident, "Whose stored settings (else the port name)")
-      ->type_name("NAME");
-  command
-      ->add_option("--plugin", options.pluginFile,
-                   "Driver to load (else $LOKA_PLUGIN, else beside loka)")
-      ->type_name("FILE");
-  command
-      ->add_option("--instance", access->instanceName, "Running instance to attach to, by its port")
-      ->type_name("NAME");
-  CLI::Option* const attach =
-      command->add_flag("--attach", access->isAttachWanted, "Only with a running instance");
-  command->add_flag("--no-attach", access->isAttachRefused, "Never with a running instance")
-      ->excludes(attach);
 }
 
 bool Resolve(InstanceAccess* access, Answer* answer) {
@@ -180,6 +202,9 @@ std::unique_ptr<LocalInstance> BeginInstance(const InstanceAccess& access, Answe
     HostOptions host;
     std::string error;
     if (MakeHostOptions(access.options, &host, &error) && !access.isQuiet) {
+      if (access.verbosity > 0) {
+        TellFiles(*instance->Session(), host);
+      }
       TellSettings(access.options, host, instance->Session());
     }
   }

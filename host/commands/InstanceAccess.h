@@ -5,9 +5,9 @@
 #include <string>
 #include <vector>
 
-#include "host/InstanceOptions.h"
 #include "host/framing/FramingFlags.h"
 #include "host/instance/Instance.h"
+#include "host/instance/InstanceOptions.h"
 
 class LocalInstance;
 
@@ -23,7 +23,8 @@ struct InstanceAccess {
   std::string portWord;      // the positional PORT
   std::string configSource;  // --config: a file, "-" or the text itself
   std::string instanceName;  // --instance; empty: the only one, or that of the configured port
-  bool isQuiet = false;
+  bool isQuiet = false;      // -q
+  int verbosity = 0;         // -v, counted
   bool isAttachWanted = false;
   bool isAttachRefused = false;
   bool acknowledges = true;

@@ -5,8 +5,8 @@
 #include <cstdio>
 #include <vector>
 
-#include "host/ExitStatus.h"
-#include "host/PortList.h"
+#include "host/base/ExitStatus.h"
+#include "host/port/PortList.h"
 #include "host/port/PortOptions.h"
 #include "host/port/PortReport.h"
 

@@ -3,9 +3,9 @@
 
 #include <CLI/CLI.hpp>
 
-#include "host/ByteText.h"
-#include "host/Output.h"
 #include "host/events/JsonLine.h"
+#include "host/text/ByteText.h"
+#include "host/text/Output.h"
 
 namespace {
 
@@ -49,7 +49,6 @@ void AddRead(CLI::App* app, ReadOptions* options) {
   CLI::Option* const json = read->add_flag("-j,--json", options->isJson, "One JSON object a tag");
   read->add_flag("-x,--hex-output", options->isHex, "Characters of the value as hexadecimal")
       ->excludes(json);
-  read->add_flag("-q,--quiet", options->access.isQuiet, "Nothing beside values and refusals");
   AddInstanceAccess(read, &options->access, false);
   read->footer("Example: loka read '0?tokens_available?unsignedInt' '0?rx_token?string-64'");
 }

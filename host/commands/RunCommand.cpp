@@ -4,13 +4,13 @@
 #include <CLI/CLI.hpp>
 #include <limits>
 
-#include "host/Output.h"
 #include "host/control/ControlPath.h"
 #include "host/events/EventSink.h"
 #include "host/events/EventText.h"
 #include "host/events/JsonLine.h"
 #include "host/events/WallClock.h"
 #include "host/instance/LocalInstance.h"
+#include "host/text/Output.h"
 
 namespace {
 
@@ -71,7 +71,6 @@ void AddRun(CLI::App* app, RunOptions* options) {
       ->check(CLI::IsMember({"auto", "never"}))
       ->type_name("WHO")
       ->capture_default_str();
-  run->add_flag("-v", options->verbosity, "Tokens too; -vv: every byte");
   AddInstanceAccess(run, &options->access);
   run->footer("Example: loka run --config scale.cfg /dev/ttyUSB0 --ack never");
 }
@@ -95,7 +94,7 @@ int RunRun(RunOptions* options) {
                                            ? "taken, published and acknowledged (--ack auto)"
                                            : "left to those who attach (--ack never)"));
   TellUser("ready; commands attach at " + ControlPath(instance->Port()));
-  LogPrinter printer(options->verbosity);
+  LogPrinter printer(options->access.verbosity);
   answer = instance->Serve(
       &printer, [] { return false; }, Deadline::After(kForeverMs));
   return EndOf(*instance, answer);

@@ -13,7 +13,6 @@ class App;
 struct RunOptions {
   InstanceAccess access;
   std::string acknowledge = "auto";  // --ack auto|never
-  int verbosity = 0;
 };
 
 void AddRun(CLI::App* app, RunOptions* options);

@@ -6,10 +6,10 @@
 #include <iostream>
 #include <iterator>
 
-#include "host/ByteText.h"
-#include "host/Output.h"
 #include "host/commands/EventPrinter.h"
 #include "host/framing/ControlNames.h"
+#include "host/text/ByteText.h"
+#include "host/text/Output.h"
 
 namespace {
 
@@ -81,7 +81,6 @@ void AddSend(CLI::App* app, SendOptions* options) {
   CLI::App* const group = send->get_option_group("What to send");
   group->add_flag("-l,--lines", options->isByLine, "Each line of standard input");
   group->require_option(1);
-  send->add_flag("-q,--quiet", options->access.isQuiet, "Say nothing when it is done");
   AddInstanceAccess(send, &options->access);
   send->footer("Example: loka send /dev/ttyUSB0 -b 9600 -p none --tx-suffix CRLF -m R");
 }
@@ -114,7 +113,6 @@ void AddAsk(CLI::App* app, AskOptions* options) {
   ask->add_flag("--fresh", options->isFresh, "Drop first what is waiting");
   CLI::Option* const json = ask->add_flag("-j,--json", options->isJson, "Answer as JSON");
   ask->add_flag("-X,--hex-output", options->isHex, "Answer as hexadecimal")->excludes(json);
-  ask->add_flag("-q,--quiet", options->access.isQuiet, "Nothing beside the answer");
   AddInstanceAccess(ask, &options->access);
   ask->footer("Example: loka ask /dev/ttyUSB0 -b 9600 -p none --rx-suffix CRLF -m R -W 2 --fresh");
 }

@@ -4,15 +4,15 @@
 #include <CLI/CLI.hpp>
 #include <algorithm>
 
-#include "host/ByteText.h"
-#include "host/Output.h"
-#include "host/Utf8Text.h"
 #include "host/commands/SettingText.h"
 #include "host/commands/SettingWord.h"
 #include "host/commands/TextTable.h"
 #include "host/control/AttachedInstance.h"
 #include "host/events/JsonLine.h"
 #include "host/instance/TrapHints.h"
+#include "host/text/ByteText.h"
+#include "host/text/Output.h"
+#include "host/text/Utf8Text.h"
 
 namespace {
 
@@ -130,7 +130,6 @@ void AddSet(CLI::App* app, SetOptions* options) {
   set->add_flag("--show", options->isShown, "Show configured, active, staged and stored values")
       ->excludes(words);
   set->add_flag("-j,--json", options->isJson, "One JSON object a line");
-  set->add_flag("-q,--quiet", options->access.isQuiet, "Nothing beside results and refusals");
   AddInstanceAccess(set, &options->access, false);
   set->footer("Keys: " + SettingNames() + "\nExample: loka set rx_suffix=CRLF baud=19200");
 }

@@ -4,8 +4,8 @@
 #include <cstdint>
 #include <cstdlib>
 
-#include "host/ByteText.h"
 #include "host/framing/ControlNames.h"
+#include "host/text/ByteText.h"
 
 namespace {
 

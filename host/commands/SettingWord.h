@@ -3,8 +3,8 @@
 
 #include <string>
 
-#include "host/StoredValue.h"
 #include "host/instance/SettingTable.h"
+#include "host/store/StoredValue.h"
 
 // A setting as people write it on the command line.
 struct SettingWord {

@@ -10,16 +10,16 @@
 #include <set>
 #include <system_error>
 
-#include "host/ExitStatus.h"
-#include "host/Output.h"
-#include "host/SqliteFile.h"
-#include "host/StorePath.h"
-#include "host/Utf8Text.h"
+#include "host/base/ExitStatus.h"
 #include "host/commands/SettingWord.h"
 #include "host/commands/StoreJson.h"
 #include "host/control/AttachedInstance.h"
 #include "host/control/ControlPath.h"
 #include "host/events/JsonLine.h"
+#include "host/store/SqliteFile.h"
+#include "host/store/StorePath.h"
+#include "host/text/Output.h"
+#include "host/text/Utf8Text.h"
 
 namespace {
 

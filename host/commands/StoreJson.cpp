@@ -5,9 +5,9 @@
 #include <limits>
 #include <nlohmann/json.hpp>
 
-#include "host/ByteText.h"
-#include "host/Utf8Text.h"
 #include "host/instance/SettingTable.h"
+#include "host/text/ByteText.h"
+#include "host/text/Utf8Text.h"
 
 namespace {
 

@@ -3,7 +3,7 @@
 
 #include <string>
 
-#include "host/SqliteFile.h"
+#include "host/store/SqliteFile.h"
 
 // Stored settings as a JSON text, for `loka store export` and `import`:
 //

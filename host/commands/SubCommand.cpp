@@ -4,8 +4,8 @@
 #include <CLI/CLI.hpp>
 #include <limits>
 
-#include "host/Output.h"
 #include "host/commands/EventPrinter.h"
+#include "host/text/Output.h"
 
 namespace {
 
@@ -17,7 +17,7 @@ bool MakePrintOptions(const SubOptions& options, PrintOptions* print, std::strin
   print->hasTime = options.hasTime;
   print->isRaw = options.isRaw;
   print->isQuiet = options.access.isQuiet;
-  print->verbosity = options.verbosity;
+  print->verbosity = options.access.verbosity;
   if (options.isJson) {
     print->form = Form::kJson;
   } else if (options.isDump) {
@@ -55,8 +55,6 @@ void AddSub(CLI::App* app, SubOptions* options) {
   sub->add_flag("-t,--time", options->hasTime, "Time of day in front of each line")->excludes(json);
   sub->add_flag("--raw", options->isRaw, "Bytes as they come instead of tokens")->excludes(format);
   sub->add_flag("--peek", options->isPeek, "Leave tokens in the queue: print the oldest only");
-  sub->add_flag("-v", options->verbosity, "More beside the tokens; -vv: every byte");
-  sub->add_flag("-q,--quiet", options->access.isQuiet, "Nothing beside the tokens");
   AddInstanceAccess(sub, &options->access);
   sub->footer(
       "Example: loka sub /dev/ttyUSB0 -b 9600 -p none --rx-prefix STX --rx-suffix ETX -C 3");

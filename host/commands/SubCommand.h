@@ -22,7 +22,6 @@ struct SubOptions {
   bool hasTime = false;
   bool isRaw = false;
   bool isPeek = false;
-  int verbosity = 0;
 };
 
 void AddSub(CLI::App* app, SubOptions* options);

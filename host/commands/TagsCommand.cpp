@@ -3,11 +3,11 @@
 
 #include <CLI/CLI.hpp>
 
-#include "host/ByteText.h"
-#include "host/Output.h"
-#include "host/Utf8Text.h"
 #include "host/commands/TextTable.h"
 #include "host/events/JsonLine.h"
+#include "host/text/ByteText.h"
+#include "host/text/Output.h"
+#include "host/text/Utf8Text.h"
 
 namespace {
 
@@ -62,7 +62,6 @@ std::string LinesOf(const Json& rows) {
 void AddTags(CLI::App* app, TagsOptions* options) {
   CLI::App* const tags = app->add_subcommand("tags", "List the memory types with their values");
   tags->add_flag("-j,--json", options->isJson, "One JSON object a tag");
-  tags->add_flag("-q,--quiet", options->access.isQuiet, "Nothing beside the tags");
   AddInstanceAccess(tags, &options->access);
   tags->footer("Example: loka tags -j");
 }

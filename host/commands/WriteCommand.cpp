@@ -3,12 +3,12 @@
 
 #include <CLI/CLI.hpp>
 
-#include "host/ByteText.h"
-#include "host/Output.h"
 #include "host/commands/SettingText.h"
 #include "host/events/JsonLine.h"
 #include "host/framing/ControlNames.h"
 #include "host/instance/TrapHints.h"
+#include "host/text/ByteText.h"
+#include "host/text/Output.h"
 
 namespace {
 
@@ -33,7 +33,6 @@ void AddWrite(CLI::App* app, WriteOptions* options) {
       ->required();
   write->add_flag("-x,--hex-value", options->isHex, "VALUE are bytes: 02 41, STX 41 CR LF");
   write->add_flag("-j,--json", options->isJson, "What was done as a JSON object");
-  write->add_flag("-q,--quiet", options->access.isQuiet, "Nothing beside results and refusals");
   AddInstanceAccess(write, &options->access, false);
   write->footer("Example: loka write '0?tx_token?string-20' R");
 }

@@ -7,7 +7,7 @@
 #include <memory>
 #include <string>
 
-#include "host/SignalWatch.h"
+#include "host/base/SignalWatch.h"
 #include "host/control/LineBuffer.h"
 #include "host/events/HostEvent.h"
 #include "host/instance/Instance.h"

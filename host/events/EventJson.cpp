@@ -5,9 +5,9 @@
 #include <stdexcept>
 #include <utility>
 
-#include "host/ByteText.h"
 #include "host/events/JsonLine.h"
 #include "host/events/WallClock.h"
+#include "host/text/ByteText.h"
 
 namespace {
 

@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "host/events/EventText.h"
 
-#include "host/ByteText.h"
+#include "host/text/ByteText.h"
 
 namespace {
 

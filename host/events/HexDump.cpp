@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "host/events/HexDump.h"
 
-#include "host/ByteText.h"
+#include "host/text/ByteText.h"
 
 std::string HexDump(std::string_view bytes) {
   std::string text = HexBytes(bytes) + "   ";

@@ -1,9 +1,9 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "host/events/TokenFormat.h"
 
-#include "host/ByteText.h"
 #include "host/events/EventJson.h"
 #include "host/events/WallClock.h"
+#include "host/text/ByteText.h"
 
 namespace {
 

@@ -7,11 +7,11 @@
 #include <set>
 #include <sstream>
 
-#include "host/ByteText.h"
-#include "host/ConfigText.h"
 #include "host/framing/ConfigEdit.h"
 #include "host/framing/ConfigKeyTable.h"
 #include "host/framing/ConfigNumber.h"
+#include "host/framing/ConfigText.h"
+#include "host/text/ByteText.h"
 
 namespace {
 

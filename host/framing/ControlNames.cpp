@@ -6,8 +6,8 @@
 #include <cctype>
 #include <cstddef>
 
-#include "host/ByteText.h"
 #include "host/framing/FramingSettings.h"
+#include "host/text/ByteText.h"
 
 namespace {
 

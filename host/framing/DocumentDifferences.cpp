@@ -3,9 +3,9 @@
 
 #include <algorithm>
 
-#include "host/ByteText.h"
-#include "host/DescriptionDocument.h"
+#include "host/document/DescriptionDocument.h"
 #include "host/framing/ConfigKeyTable.h"
+#include "host/text/ByteText.h"
 
 namespace {
 

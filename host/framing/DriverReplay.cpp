@@ -4,11 +4,11 @@
 #include <memory>
 #include <utility>
 
-#include "host/HostTag.h"
-#include "host/PluginLoader.h"
 #include "host/framing/ConfigEdit.h"
 #include "host/framing/FramingSettings.h"
 #include "host/framing/ReplayHost.h"
+#include "host/runtime/HostTag.h"
+#include "host/runtime/PluginLoader.h"
 #include "interfaces/IProtModule.h"
 #include "interfaces/IProtocol.h"
 #include "interfaces/IProtocolFactory.h"

@@ -4,7 +4,7 @@
 #include <string>
 #include <vector>
 
-#include "host/ExitStatus.h"
+#include "host/base/ExitStatus.h"
 #include "host/framing/LineScript.h"
 
 // How a replay went.

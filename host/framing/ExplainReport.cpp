@@ -5,8 +5,8 @@
 #include <nlohmann/json.hpp>
 #include <utility>
 
-#include "host/ByteText.h"
 #include "host/events/JsonLine.h"
+#include "host/text/ByteText.h"
 
 namespace {
 

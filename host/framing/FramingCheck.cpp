@@ -4,7 +4,7 @@
 #include <algorithm>
 #include <unordered_map>
 
-#include "host/ByteText.h"
+#include "host/text/ByteText.h"
 
 namespace {
 

@@ -7,10 +7,10 @@
 #include <limits>
 #include <string_view>
 
-#include "host/ByteText.h"
 #include "host/framing/ConfigEdit.h"
 #include "host/framing/ConfigKeyTable.h"
 #include "host/framing/ControlNames.h"
+#include "host/text/ByteText.h"
 
 namespace {
 

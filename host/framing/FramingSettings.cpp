@@ -4,8 +4,8 @@
 #include <algorithm>
 #include <cstddef>
 
-#include "host/ConfigText.h"
 #include "host/framing/ConfigNumber.h"
+#include "host/framing/ConfigText.h"
 
 namespace {
 

@@ -10,8 +10,8 @@
 #include <limits>
 #include <sstream>
 
-#include "host/ByteText.h"
 #include "host/framing/ControlNames.h"
+#include "host/text/ByteText.h"
 
 namespace {
 

@@ -5,9 +5,9 @@
 #include <functional>
 #include <utility>
 
-#include "host/HostCdsBuffer.h"
-#include "host/HostSocketFactory.h"
 #include "host/framing/LineScript.h"
+#include "host/runtime/HostCdsBuffer.h"
+#include "host/runtime/HostSocketFactory.h"
 #include "interfaces/IInterfaceFactory.h"
 #include "interfaces/IMultiTask2.h"
 #include "interfaces/ISemaphore.h"

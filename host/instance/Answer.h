@@ -6,7 +6,7 @@
 #include <utility>
 #include <vector>
 
-#include "host/ExitStatus.h"
+#include "host/base/ExitStatus.h"
 
 // How a request to an instance went, in this process or in another one.
 struct Answer {

@@ -5,7 +5,7 @@
 #include <nlohmann/json_fwd.hpp>
 #include <string>
 
-#include "host/Deadline.h"
+#include "host/base/Deadline.h"
 #include "host/instance/Answer.h"
 
 class EventSink;

@@ -4,7 +4,7 @@
 #include <chrono>
 #include <utility>
 
-#include "host/Deadline.h"
+#include "host/base/Deadline.h"
 #include "host/events/WallClock.h"
 
 namespace {

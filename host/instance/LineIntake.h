@@ -9,7 +9,7 @@
 #include <string_view>
 #include <vector>
 
-#include "host/PortObserver.h"
+#include "host/port/PortObserver.h"
 
 class Deadline;
 

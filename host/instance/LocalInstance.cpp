@@ -3,11 +3,11 @@
 
 #include <utility>
 
-#include "host/ByteText.h"
-#include "host/PortAdvice.h"
 #include "host/events/EventJson.h"
 #include "host/events/EventSink.h"
 #include "host/events/WallClock.h"
+#include "host/port/PortAdvice.h"
+#include "host/text/ByteText.h"
 
 namespace {
 

@@ -5,16 +5,16 @@
 #include <memory>
 #include <string>
 
-#include "host/HostSession.h"
-#include "host/InstanceOptions.h"
-#include "host/SignalWatch.h"
+#include "host/base/SignalWatch.h"
 #include "host/control/ControlServer.h"
 #include "host/events/EventStream.h"
 #include "host/events/Statistics.h"
 #include "host/instance/Instance.h"
+#include "host/instance/InstanceOptions.h"
 #include "host/instance/LineIntake.h"
 #include "host/instance/Requests.h"
 #include "host/instance/TokenPump.h"
+#include "host/runtime/HostSession.h"
 
 // A driver that this process runs. One thread opens, calls and serves; a control server answers
 // other processes meanwhile.

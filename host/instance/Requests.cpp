@@ -8,15 +8,15 @@
 #include <optional>
 #include <utility>
 
-#include "host/ByteText.h"
-#include "host/HostSession.h"
-#include "host/HostTag.h"
-#include "host/PortAdvice.h"
-#include "host/SessionConsole.h"
 #include "host/events/EventStream.h"
 #include "host/events/Statistics.h"
 #include "host/instance/TagValue.h"
 #include "host/instance/TrapHints.h"
+#include "host/port/PortAdvice.h"
+#include "host/runtime/HostSession.h"
+#include "host/runtime/HostTag.h"
+#include "host/runtime/SessionConsole.h"
+#include "host/text/ByteText.h"
 #include "interfaces/IProtocol.h"
 
 namespace {

@@ -4,7 +4,7 @@
 #include <array>
 #include <string>
 
-#include "host/StoredValue.h"
+#include "host/store/StoredValue.h"
 
 // The twelve settings that can change while the driver runs, under all their names: the key in the
 // permanent storage and on our command line, the key in the configuration text, the memory type of

@@ -3,7 +3,7 @@
 
 #include <cstddef>
 
-#include "host/ConfigText.h"
+#include "host/framing/ConfigText.h"
 
 SettingsBook::SettingsBook(const std::string& configuration) {
   for (const SettingEntry& setting : kSettingTable) {

@@ -8,7 +8,7 @@
 #include <limits>
 #include <system_error>
 
-#include "host/ByteText.h"
+#include "host/text/ByteText.h"
 #include "interfaces/ITag.h"
 
 namespace {

@@ -8,12 +8,12 @@
 #include <string>
 #include <vector>
 
-#include "host/Deadline.h"
-#include "host/TokenReader.h"
+#include "host/base/Deadline.h"
 #include "host/events/HostEvent.h"
 #include "host/framing/FramingCheck.h"
 #include "host/instance/Answer.h"
 #include "host/instance/LineIntake.h"
+#include "host/runtime/TokenReader.h"
 
 class EventStream;
 class HostSession;

@@ -4,7 +4,7 @@
 #include <algorithm>
 #include <nlohmann/json.hpp>
 
-#include "host/ByteText.h"
+#include "host/text/ByteText.h"
 
 namespace {
 

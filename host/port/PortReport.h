@@ -4,7 +4,7 @@
 #include <string>
 #include <vector>
 
-#include "host/PortList.h"
+#include "host/port/PortList.h"
 
 // How listed ports are shown. What an adapter says of itself is escaped. All functions: any thread.
 

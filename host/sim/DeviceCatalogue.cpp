@@ -1,13 +1,13 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "host/sim/DeviceCatalogue.h"
 
-#include "host/ByteText.h"
 #include "host/sim/BarcodeDevice.h"
 #include "host/sim/GaugeDevice.h"
 #include "host/sim/ModemDevice.h"
 #include "host/sim/PrinterDevice.h"
 #include "host/sim/RfidDevice.h"
 #include "host/sim/ScaleDevice.h"
+#include "host/text/ByteText.h"
 #include "interfaces/ISerialPort.h"
 
 namespace {

@@ -5,7 +5,7 @@
 #include <string>
 #include <vector>
 
-#include "host/LineSettings.h"
+#include "host/port/LineSettings.h"
 #include "host/sim/Device.h"
 #include "host/sim/DeviceSettings.h"
 

@@ -12,8 +12,8 @@
 #include <cstdlib>
 #include <system_error>
 
-#include "host/Deadline.h"
-#include "host/LineSettings.h"
+#include "host/base/Deadline.h"
+#include "host/port/LineSettings.h"
 
 namespace {
 

@@ -1,8 +1,8 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "host/sim/RfidDevice.h"
 
-#include "host/ByteText.h"
 #include "host/sim/SimRandom.h"
+#include "host/text/ByteText.h"
 
 namespace {
 

@@ -4,9 +4,9 @@
 #include <cstdio>
 #include <nlohmann/json.hpp>
 
-#include "host/ByteText.h"
 #include "host/events/JsonLine.h"
 #include "host/events/WallClock.h"
+#include "host/text/ByteText.h"
 
 namespace {
 

@@ -17,9 +17,9 @@
 #include <stdexcept>
 #include <string>
 
-#include "host/Deadline.h"
-#include "host/ExitStatus.h"
-#include "host/SignalWatch.h"
+#include "host/base/Deadline.h"
+#include "host/base/ExitStatus.h"
+#include "host/base/SignalWatch.h"
 #include "host/events/WallClock.h"
 #include "host/sim/DeviceCatalogue.h"
 #include "host/sim/DeviceLink.h"

@@ -7,7 +7,7 @@
 #include <sstream>
 #include <utility>
 
-#include "host/ByteText.h"
+#include "host/text/ByteText.h"
 
 namespace {
 

@@ -5,9 +5,9 @@
 #include <string>
 #include <vector>
 
-#include "host/PseudoTerminal.h"
-#include "tests/host/PluginConfiguration.h"
-#include "tests/host/ProgramRun.h"
+#include "host/port/PseudoTerminal.h"
+#include "tests/host/support/PluginConfiguration.h"
+#include "tests/host/support/ProgramRun.h"
 
 // "loka run" on a pseudo-terminal, and other commands beside it: all with the same control folder
 // and the same store, both of this object alone.

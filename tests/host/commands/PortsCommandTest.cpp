@@ -4,13 +4,13 @@
 #include <fstream>
 #include <nlohmann/json.hpp>
 
-#include "host/CommandLine.h"
-#include "host/PortList.h"
-#include "host/PseudoTerminal.h"
+#include "host/commands/CommandLine.h"
+#include "host/port/PortList.h"
 #include "host/port/PortOptions.h"
 #include "host/port/PortReport.h"
-#include "tests/host/LockingProcess.h"
-#include "tests/host/TemporaryFolder.h"
+#include "host/port/PseudoTerminal.h"
+#include "tests/host/port/LockingProcess.h"
+#include "tests/host/support/TemporaryFolder.h"
 
 namespace fs = std::filesystem;
 

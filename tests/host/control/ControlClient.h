@@ -10,7 +10,7 @@
 #include <stdexcept>
 #include <string>
 
-#include "host/Deadline.h"
+#include "host/base/Deadline.h"
 
 // A client of a control socket that may send anything. One thread.
 class ControlClient {

@@ -4,7 +4,7 @@
 #include <cstdlib>
 #include <string>
 
-#include "tests/host/TemporaryFolder.h"
+#include "tests/host/support/TemporaryFolder.h"
 
 // Lets this process look for control sockets in a folder of its own for as long as it lives. The
 // folder itself is not there yet.

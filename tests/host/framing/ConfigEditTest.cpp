@@ -3,10 +3,10 @@
 
 #include <fstream>
 
-#include "host/ConfigText.h"
 #include "host/framing/ConfigEdit.h"
 #include "host/framing/ConfigReport.h"
-#include "tests/host/TemporaryFolder.h"
+#include "host/framing/ConfigText.h"
+#include "tests/host/support/TemporaryFolder.h"
 
 namespace {
 

@@ -7,11 +7,11 @@
 #include <map>
 #include <random>
 
-#include "host/HostTag.h"
 #include "host/framing/ReplayHost.h"
+#include "host/runtime/HostTag.h"
 #include "interfaces/IProtocol7.h"
-#include "tests/host/PluginConfiguration.h"
 #include "tests/host/framing/LabelLog.h"
+#include "tests/host/support/PluginConfiguration.h"
 #include "tests/support/PluginUnderTest.h"
 
 namespace {

@@ -1,8 +1,8 @@
 // SPDX-License-Identifier: Apache-2.0
 #include <gtest/gtest.h>
 
-#include "host/DescriptionBlock.h"
-#include "host/DescriptionDocument.h"
+#include "host/document/DescriptionBlock.h"
+#include "host/document/DescriptionDocument.h"
 #include "host/framing/ConfigKeyTable.h"
 #include "host/framing/DocumentDifferences.h"
 #include "tests/support/PluginLibrary.h"

@@ -7,8 +7,8 @@
 
 #include "host/framing/ConfigEdit.h"
 #include "host/framing/DriverReplay.h"
-#include "tests/host/PluginConfiguration.h"
 #include "tests/host/framing/LabelLog.h"
+#include "tests/host/support/PluginConfiguration.h"
 #include "tests/support/PluginLibrary.h"
 
 namespace {

@@ -7,8 +7,8 @@
 
 #include "interfaces/IProtocol7.h"
 #include "interfaces/ITag.h"
-#include "tests/host/PluginConfiguration.h"
 #include "tests/host/framing/LabelLog.h"
+#include "tests/host/support/PluginConfiguration.h"
 #include "tests/support/PluginUnderTest.h"
 #include "tests/support/ScriptedHost.h"
 

@@ -4,9 +4,9 @@
 #include <CLI/CLI.hpp>
 #include <memory>
 
-#include "host/HostSession.h"
 #include "host/framing/ConfigKeyTable.h"
 #include "host/framing/FramingFlags.h"
+#include "host/runtime/HostSession.h"
 #include "tests/support/PluginLibrary.h"
 
 namespace {

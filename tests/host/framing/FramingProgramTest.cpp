@@ -6,8 +6,8 @@
 #include <nlohmann/json.hpp>
 #include <sstream>
 
-#include "tests/host/ProgramRun.h"
-#include "tests/host/TemporaryFolder.h"
+#include "tests/host/support/ProgramRun.h"
+#include "tests/host/support/TemporaryFolder.h"
 
 namespace {
 

@@ -4,8 +4,8 @@
 #include <string>
 #include <vector>
 
-#include "host/ByteText.h"
 #include "host/framing/ByteLabeller.h"
+#include "host/text/ByteText.h"
 
 // Keeps what a labeller tells, and holds it to its promise: every byte once, in order.
 class LabelLog final : public LabelSink {

@@ -3,9 +3,9 @@
 
 #include <fstream>
 
-#include "host/ByteText.h"
 #include "host/framing/LineScript.h"
-#include "tests/host/TemporaryFolder.h"
+#include "host/text/ByteText.h"
+#include "tests/host/support/TemporaryFolder.h"
 
 namespace {
 

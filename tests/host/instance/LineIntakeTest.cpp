@@ -4,7 +4,7 @@
 #include <csignal>
 #include <thread>
 
-#include "host/Deadline.h"
+#include "host/base/Deadline.h"
 #include "host/instance/LineIntake.h"
 
 namespace {

@@ -4,14 +4,14 @@
 #include <atomic>
 #include <thread>
 
-#include "host/ByteText.h"
-#include "host/PseudoTerminal.h"
 #include "host/control/AttachedInstance.h"
 #include "host/events/EventSink.h"
 #include "host/instance/LocalInstance.h"
 #include "host/instance/Requests.h"
-#include "tests/host/PluginConfiguration.h"
+#include "host/port/PseudoTerminal.h"
+#include "host/text/ByteText.h"
 #include "tests/host/control/ControlFolder.h"
+#include "tests/host/support/PluginConfiguration.h"
 #include "tests/support/PluginLibrary.h"
 
 namespace {

@@ -5,10 +5,10 @@
 #include <string>
 #include <vector>
 
-#include "host/PosixSerialPort.h"
-#include "host/PseudoTerminal.h"
+#include "host/port/PosixSerialPort.h"
+#include "host/port/PseudoTerminal.h"
 #include "interfaces/ISerialPort.h"
-#include "tests/host/CountingObserver.h"
+#include "tests/host/port/CountingObserver.h"
 #include "tests/host/port/FakeTerminalCalls.h"
 
 namespace {

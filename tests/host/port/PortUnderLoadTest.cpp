@@ -11,13 +11,13 @@
 #include <thread>
 #include <vector>
 
-#include "host/Deadline.h"
-#include "host/HostEvents.h"
-#include "host/HostSession.h"
-#include "host/PseudoTerminal.h"
-#include "host/TokenReader.h"
+#include "host/base/Deadline.h"
 #include "host/port/MonotonicTime.h"
-#include "tests/host/PluginConfiguration.h"
+#include "host/port/PseudoTerminal.h"
+#include "host/runtime/HostEvents.h"
+#include "host/runtime/HostSession.h"
+#include "host/runtime/TokenReader.h"
+#include "tests/host/support/PluginConfiguration.h"
 #include "tests/support/PluginLibrary.h"
 
 namespace {

@@ -5,7 +5,7 @@
 #include <fstream>
 
 #include "host/sim/DeviceLink.h"
-#include "tests/host/TemporaryFolder.h"
+#include "tests/host/support/TemporaryFolder.h"
 
 namespace {
 

@@ -3,10 +3,10 @@
 
 #include <set>
 
-#include "host/ByteText.h"
 #include "host/sim/CommandCollector.h"
 #include "host/sim/DeviceCatalogue.h"
 #include "host/sim/PrinterDevice.h"
+#include "host/text/ByteText.h"
 
 namespace {
 

@@ -10,7 +10,7 @@
 #include <cerrno>
 #include <string>
 
-#include "host/Deadline.h"
+#include "host/base/Deadline.h"
 
 // The host's end of a simulated device's port, opened like any program would.
 class HostEnd {

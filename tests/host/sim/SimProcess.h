@@ -5,8 +5,8 @@
 #include <string>
 #include <vector>
 
-#include "host/ByteText.h"
-#include "tests/host/ProgramRun.h"
+#include "host/text/ByteText.h"
+#include "tests/host/support/ProgramRun.h"
 
 // "loka sim" with -j on a link in a folder of its own; collects what it tells.
 class SimProcess {

@@ -8,9 +8,9 @@
 #include <sstream>
 #include <thread>
 
-#include "tests/host/PluginConfiguration.h"
 #include "tests/host/sim/HostEnd.h"
 #include "tests/host/sim/SimProcess.h"
+#include "tests/host/support/PluginConfiguration.h"
 #include "tests/support/ReferenceFramer.h"
 
 namespace {
@@ -222,7 +222,7 @@ TEST(SimProgram, TheSeedRepeatsEveryByte) {
   EXPECT_NE(run("2"), first);
 }
 
-// The bytes that "watch" shows in hexadecimal at the end of a token's line.
+// The bytes that "sub" shows in hexadecimal at the end of a token's line.
 std::string TokenOf(const std::string& line) {
   std::string bytes = "(no token)";
   const std::size_t quote = line.rfind('"');
@@ -250,8 +250,9 @@ TEST_P(SimWatch, EachTokenIsAccountedFor) {
   const std::string framing =
       (GetParam().prefix.empty() ? "" : " rx_prefix=" + CompactHex(GetParam().prefix)) +
       " rx_suffix=" + CompactHex(GetParam().suffix);
-  ProgramRun watch({"watch", "--port", "com1=" + sim.LinkPath(), "--no-store", "--config",
-                    TestConfiguration("gap=60000 hex_tokens=true" + framing)});
+  ProgramRun sub({"sub", "-F", "%t  %l  \"%p\"  %x", "--port", "com1=" + sim.LinkPath(),
+                  "--no-store", "--config",
+                  TestConfiguration("gap=60000 hex_tokens=true" + framing)});
   sim.Finish();
   EXPECT_EQ(sim.Run().Status(), 0);
   const auto sent = sim.Events("sent");
@@ -264,10 +265,10 @@ TEST_P(SimWatch, EachTokenIsAccountedFor) {
   const auto tokens = ReferenceTokens(line, GetParam().prefix, GetParam().suffix);
   EXPECT_GT(tokens.size(), 10U);
   for (const std::string& token : tokens) {
-    EXPECT_EQ(CompactHex(TokenOf(watch.Line())), CompactHex(token));
+    EXPECT_EQ(CompactHex(TokenOf(sub.Line())), CompactHex(token));
   }
-  watch.Signal(SIGTERM);
-  EXPECT_EQ(watch.Output(), "");
+  sub.Signal(SIGTERM);
+  EXPECT_EQ(sub.Output(), "");
 }
 
 INSTANTIATE_TEST_SUITE_P(

@@ -2,9 +2,9 @@
 #include <gtest/gtest.h>
 
 #include "host/events/WallClock.h"
-#include "tests/host/PluginConfiguration.h"
 #include "tests/host/sim/HostEnd.h"
 #include "tests/host/sim/SimProcess.h"
+#include "tests/host/support/PluginConfiguration.h"
 
 namespace {
 
@@ -21,14 +21,14 @@ std::int64_t TimeOf(const SimProcess::Json& event) {
 // gap of 50 ms, so the machine may be late by up to 250 ms.
 TEST(SimTime, SilenceFramesTheValuesOfTheGauge) {
   SimProcess sim({"gauge", "--every", "300", "--count", "6"});
-  ProgramRun watch({"watch", "--port", "com1=" + sim.LinkPath(), "--no-store", "--config",
-                    TestConfiguration("gap=50")});
+  ProgramRun sub({"sub", "-F", "%t  %l  \"%p\"  %x", "--port", "com1=" + sim.LinkPath(),
+                  "--no-store", "--config", TestConfiguration("gap=50")});
   sim.Finish();
   EXPECT_EQ(sim.Run().Status(), 0);
   const auto sent = sim.Events("sent");
   ASSERT_EQ(sent.size(), 6U);
   for (const SimProcess::Json& event : sent) {
-    const std::string line = watch.Line();
+    const std::string line = sub.Line();
     EXPECT_NE(line.find("\"" + event["text"].get<std::string>() + "\""), std::string::npos) << line;
   }
 }
@@ -36,14 +36,14 @@ TEST(SimTime, SilenceFramesTheValuesOfTheGauge) {
 // A pause inside a value that is longer than the gap cuts it. Margin: 200 ms against 50 ms.
 TEST(SimTime, ASplitLongerThanTheGapCutsAValue) {
   SimProcess sim({"gauge", "--every", "600", "--count", "2", "--split", "2@200ms"});
-  ProgramRun watch({"watch", "--port", "com1=" + sim.LinkPath(), "--no-store", "--config",
-                    TestConfiguration("gap=50")});
+  ProgramRun sub({"sub", "-F", "%t  %l  \"%p\"  %x", "--port", "com1=" + sim.LinkPath(),
+                  "--no-store", "--config", TestConfiguration("gap=50")});
   sim.Finish();
   for (const SimProcess::Json& event : sim.Events("sent")) {
     EXPECT_EQ(event["fault"], SimProcess::Json({"split"}));
     std::string whole;
     for (int piece = 0; piece < 2; ++piece) {
-      const std::string line = watch.Line();
+      const std::string line = sub.Line();
       const std::size_t begin = line.find('"') + 1;
       whole += line.substr(begin, line.find('"', begin) - begin);
     }
