@@ -1,0 +1,19 @@
+# SPDX-License-Identifier: Apache-2.0
+# What the toolchain files of the panels share. LOKA_PANEL_TRIPLET names the cross compiler.
+set(CMAKE_SYSTEM_NAME Linux)
+set(CMAKE_SYSTEM_PROCESSOR arm)
+set(CMAKE_C_COMPILER ${LOKA_PANEL_TRIPLET}-gcc)
+set(CMAKE_CXX_COMPILER ${LOKA_PANEL_TRIPLET}-g++)
+set(CMAKE_LIBRARY_ARCHITECTURE ${LOKA_PANEL_TRIPLET})
+
+# Libraries for the target that tests and the reference host use; scripts/panel.sh fills the folder.
+# Nothing of the build machine may be found in their place.
+set(CMAKE_FIND_ROOT_PATH ${CMAKE_BINARY_DIR}/target)
+set(CMAKE_FIND_ROOT_PATH_MODE_PROGRAM NEVER)
+set(CMAKE_FIND_ROOT_PATH_MODE_LIBRARY ONLY)
+set(CMAKE_FIND_ROOT_PATH_MODE_INCLUDE ONLY)
+set(CMAKE_FIND_ROOT_PATH_MODE_PACKAGE ONLY)
+
+# Programs for the target run under user-mode emulation.
+set(CMAKE_CROSSCOMPILING_EMULATOR qemu-arm -L /usr/${LOKA_PANEL_TRIPLET} -E
+                                  LD_LIBRARY_PATH=${CMAKE_BINARY_DIR}/target/usr/lib/${LOKA_PANEL_TRIPLET})
