@@ -11,12 +11,14 @@ usage() {
 usage: scripts/panel.sh COMMAND
 
   build   cross-builds libLOKA.so for armhf and armel, checks both and prints their figures
+  check [ABI...]
+          runs the unit and plug-in tests for both under user-mode emulation
   help    prints this text
 TEXT
 }
 
 case "${1:-}" in
-  build)
+  build | check)
     command=$1
     shift
     . "$(dirname "$0")/panel/$command.sh"

@@ -154,7 +154,12 @@ void AddInstanceAccess(CLI::App* command, InstanceAccess* access, bool hasPortWo
       ->excludes(quiet);
   AddPortAndStore(command, access);
   AddAttaching(command, access);
+  const std::size_t before = command->get_options().size();
   access->framing.AddAll(command);
+  const std::vector<CLI::Option*> options = command->get_options();
+  for (std::size_t at = before; at < options.size(); ++at) {
+    options[at]->group("Line and framing");
+  }
 }
 
 bool Resolve(InstanceAccess* access, Answer* answer) {

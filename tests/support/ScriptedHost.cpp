@@ -24,7 +24,8 @@ ScriptedHost::ScriptedHost()
 IInterface* ScriptedHost::CreateInterface(const char* name) {
   const std::string asked = name != nullptr ? name : "(null)";
   const auto found = services_.find(asked);
-  const bool given = found != services_.end() && absent_.count(asked) == 0;
+  const bool given =
+      found != services_.end() && absent_.count(asked) == 0 && !faults_.IsToFail("CreateInterface");
   log_.Add("CreateInterface " + asked + (given ? "" : " -> null"));
   if (!given) return nullptr;
   ++lent_[asked];
@@ -43,13 +44,15 @@ void ScriptedHost::ReleaseInterface(IInterface* interface) {
 
 void ScriptedHost::RunUntilSilent(const std::string& port) {
   ScriptedLine& line = Line(port);
-  if (ScriptedTask* task = multiTask_.LastTask()) {
+  ScriptedTask* task = multiTask_.LastTask();
+  if (task != nullptr && !task->IsEnded()) {
     task->RunUntil([&line] { return line.IsExhausted(); });
   }
 }
 
 void ScriptedHost::RunPasses(int count) {
-  if (ScriptedTask* task = multiTask_.LastTask()) task->RunPasses(count);
+  ScriptedTask* task = multiTask_.LastTask();
+  if (task != nullptr && !task->IsEnded()) task->RunPasses(count);
 }
 
 std::string ScriptedHost::Complaints() const {

@@ -1,6 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "tests/support/ScriptedMultiTask.h"
 
+#include <algorithm>
 #include <thread>
 #include <utility>
 
@@ -106,6 +107,12 @@ ScriptedSemaphore* ScriptedMultiTask::Semaphore(const std::string& name) {
     if (semaphore->Name() == name) return semaphore.get();
   }
   return nullptr;
+}
+
+bool ScriptedMultiTask::IsAnySemaphoreHeld() const {
+  const std::lock_guard<std::mutex> guard(mutex_);
+  return std::any_of(semaphores_.begin(), semaphores_.end(),
+                     [](const auto& semaphore) { return semaphore->IsHeld(); });
 }
 
 std::string ScriptedMultiTask::Leftovers() const {

@@ -40,6 +40,7 @@ class ScriptedMultiTask final : public IMultiTask2 {
 
   ScriptedTask* LastTask();
   ScriptedSemaphore* Semaphore(const std::string& name);
+  bool IsAnySemaphoreHeld() const;
   // What is still held, not deleted or not stopped; empty when everything is as it should be.
   std::string Leftovers() const;
 

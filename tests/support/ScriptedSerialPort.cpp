@@ -61,7 +61,8 @@ int ScriptedSerialPort::Receive(unsigned char* byte, int timeoutMs, int reserved
   const UseCount use(users_);
   CheckOpen("Receive");
   if (reserved != 0) log_.AddViolation("Receive with a last argument other than 0");
-  const bool received = line_.Receive(byte, timeoutMs);
+  // A receive that fails is a time-out; the byte stays for the next one.
+  const bool received = !faults_.IsToFail("Receive") && line_.Receive(byte, timeoutMs);
   CheckOpen("Receive");
   log_.Add("Receive " + std::to_string(timeoutMs) + " -> " +
            (received ? HexDump(std::string(1, static_cast<char>(*byte))) : "time-out"));

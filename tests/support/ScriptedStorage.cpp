@@ -18,7 +18,8 @@ std::string Text(const char* text) { return text != nullptr ? text : ""; }
 
 void* ScriptedStorage::ConvertTo(const char* name) {
   const bool plain = CompareInterface(name, "IPermanentStorage");
-  const bool extended = CompareInterface(name, "IPermanentStorage2") && extended_;
+  const bool extended =
+      CompareInterface(name, "IPermanentStorage2") && extended_ && !faults_.IsToFail("ConvertTo");
   log_.Add("ConvertTo " + Text(name) + (plain || extended ? " -> 1" : " -> 0"));
   return plain || extended ? this : nullptr;
 }
@@ -52,7 +53,8 @@ const ScriptedStorage::Value* ScriptedStorage::Find(const std::string& ident,
 
 const char* ScriptedStorage::GetString(const char* ident, const char* key) {
   const std::lock_guard<std::mutex> guard(mutex_);
-  const Value* value = Find(Text(ident), Text(key), Value::Type::kString);
+  const Value* value =
+      faults_.IsToFail("GetString") ? nullptr : Find(Text(ident), Text(key), Value::Type::kString);
   log_.Add("GetString" + Address(ident, key) +
            (value != nullptr ? " -> " + value->stringValue : " -> null"));
   return value != nullptr ? value->stringValue.c_str() : nullptr;
@@ -60,7 +62,9 @@ const char* ScriptedStorage::GetString(const char* ident, const char* key) {
 
 bool ScriptedStorage::GetBoolean(const char* ident, const char* key) {
   const std::lock_guard<std::mutex> guard(mutex_);
-  const Value* value = Find(Text(ident), Text(key), Value::Type::kBoolean);
+  const Value* value = faults_.IsToFail("GetBoolean")
+                           ? nullptr
+                           : Find(Text(ident), Text(key), Value::Type::kBoolean);
   const bool result = value != nullptr && value->boolValue;
   log_.Add("GetBoolean" + Address(ident, key) + (result ? " -> true" : " -> false"));
   return result;
@@ -68,7 +72,9 @@ bool ScriptedStorage::GetBoolean(const char* ident, const char* key) {
 
 int ScriptedStorage::GetInteger(const char* ident, const char* key) {
   const std::lock_guard<std::mutex> guard(mutex_);
-  const Value* value = Find(Text(ident), Text(key), Value::Type::kInteger);
+  const Value* value = faults_.IsToFail("GetInteger")
+                           ? nullptr
+                           : Find(Text(ident), Text(key), Value::Type::kInteger);
   const int result = value != nullptr ? value->intValue : 0;
   log_.Add("GetInteger" + Address(ident, key) + " -> " + std::to_string(result));
   return result;
@@ -76,7 +82,7 @@ int ScriptedStorage::GetInteger(const char* ident, const char* key) {
 
 int ScriptedStorage::Exists(const char* ident, const char* key) {
   const std::lock_guard<std::mutex> guard(mutex_);
-  const bool result = values_.count({Text(ident), Text(key)}) != 0;
+  const bool result = !faults_.IsToFail("Exists") && values_.count({Text(ident), Text(key)}) != 0;
   log_.Add("Exists" + Address(ident, key) + (result ? " -> 1" : " -> 0"));
   return result ? 1 : 0;
 }
