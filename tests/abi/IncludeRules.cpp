@@ -36,6 +36,7 @@ const std::map<std::string, std::vector<std::string>>& AllowedFolders() {
       {"host/", {"interfaces/", "host/"}},
       {"tests/support/", {"interfaces/", "tests/support/"}},
       {"tests/plugin/", {"interfaces/", "tests/support/", "tests/plugin/"}},
+      {"tests/panel/", {"interfaces/", "tests/support/", "tests/plugin/", "tests/panel/"}},
       {"tests/abi/", {"interfaces/", "tests/support/", "tests/abi/"}},
       {"tests/host/", {"interfaces/", "host/", "tests/support/", "tests/host/"}}};
   return kAllowed;
