@@ -14,6 +14,7 @@
 #include "host/commands/DemoCommand.h"
 #include "host/commands/DescribeCommand.h"
 #include "host/commands/ExplainCommand.h"
+#include "host/commands/HelpText.h"
 #include "host/commands/PortsCommand.h"
 #include "host/commands/ReadCommand.h"
 #include "host/commands/RunCommand.h"
@@ -32,6 +33,13 @@ constexpr const char* kVersion = "loka 1.0.0";
 constexpr const char* kFooter =
     "Exit status: 0 done, 1 refused, 2 usage, 3 plug-in, 4 configuration, 5 port,\n"
     "6 line gone, 7 difference, 27 not in time, 128+n signal n. Results go to stdout.";
+
+// The groups of the list of commands, in its order; commands of one group stand together.
+constexpr const char* kEveryday = "Everyday";
+constexpr const char* kTagsAndSettings = "Tags and settings";
+constexpr const char* kKnowing = "Knowing";
+constexpr const char* kKeeping = "Keeping";
+constexpr const char* kHidden = "";
 
 // A command made of its options and two functions.
 template <class Options, auto kAdd, auto kRun>
@@ -62,15 +70,6 @@ std::unique_ptr<Command> Make() {
   return std::make_unique<CommandOf<Options, kAdd, kRun>>();
 }
 
-// Which options exclude one another is told when both are given; in a list of options it is noise.
-class HelpText final : public CLI::Formatter {
- public:
-  std::string make_option_opts(const CLI::Option* option) const override {
-    std::string text = CLI::Formatter::make_option_opts(option);
-    return text.substr(0, text.find(" Excludes:"));
-  }
-};
-
 // Options of every command may stand in front of its name as well; the parser wants them behind it.
 void MoveBehindName(std::vector<std::string>* words) {
   constexpr std::string_view kWithValue[] = {"--plugin", "--profile", "--color"};
@@ -99,40 +98,40 @@ void MoveBehindName(std::vector<std::string>* words) {
 }  // namespace
 
 CommandTree::CommandTree()
-    : app_(std::make_unique<CLI::App>("Runs the serial token driver on ports of this machine.",
-                                      "loka")) {
+    : app_(std::make_unique<CLI::App>("Runs the serial token driver on this machine.", "loka")) {
   app_->set_version_flag("--version", kVersion);
   app_->footer(kFooter);
   app_->require_subcommand(0, 1);
   app_->formatter(std::make_shared<HelpText>());
-  Add(Make<SubOptions, AddSub, RunSub>());
-  Add(Make<SendOptions, AddSend, RunSend>());
-  Add(Make<AskOptions, AddAsk, RunAsk>());
-  Add(std::make_unique<CmdCommand>());
-  Add(Make<PortsOptions, AddPorts, RunPorts>());
-  Add(Make<TagsOptions, AddTags, RunTags>());
-  Add(Make<ReadOptions, AddRead, RunRead>());
-  Add(Make<WriteOptions, AddWrite, RunWrite>());
-  Add(Make<SetOptions, AddSet, RunSet>());
-  Add(Make<StoreOptions, AddStore, RunStore>());
-  Add(Make<ConnectOptions, AddConnect, RunConnect>());
-  Add(Make<ExplainOptions, AddExplain, RunExplain>());
-  Add(Make<DescribeOptions, AddDescribe, RunDescribe>());
-  Add(Make<ConfigOptions, AddConfig, RunConfig>());
-  Add(Make<StatsOptions, AddStats, RunStats>());
-  Add(Make<SimOptions, AddSim, RunSim>());
-  Add(Make<RunOptions, AddRun, RunRun>());
-  Add(Make<DemoOptions, AddDemo, RunDemo>());
-  // The demonstration's own other processes; an empty group hides them.
-  Add(Make<DemoDeviceOptions, AddDemoDevice, RunDemoDeviceProcess>());
-  Add(Make<DemoRestartedOptions, AddDemoRestarted, RunDemoRestartedProcess>());
+  Add(kEveryday, Make<SubOptions, AddSub, RunSub>());
+  Add(kEveryday, Make<SendOptions, AddSend, RunSend>());
+  Add(kEveryday, Make<AskOptions, AddAsk, RunAsk>());
+  Add(kEveryday, std::make_unique<CmdCommand>());
+  Add(kEveryday, Make<PortsOptions, AddPorts, RunPorts>());
+  Add(kTagsAndSettings, Make<TagsOptions, AddTags, RunTags>());
+  Add(kTagsAndSettings, Make<ReadOptions, AddRead, RunRead>());
+  Add(kTagsAndSettings, Make<WriteOptions, AddWrite, RunWrite>());
+  Add(kTagsAndSettings, Make<SetOptions, AddSet, RunSet>());
+  Add(kTagsAndSettings, Make<StoreOptions, AddStore, RunStore>());
+  Add(kTagsAndSettings, Make<ConnectOptions, AddConnect, RunConnect>());
+  Add(kKnowing, Make<ExplainOptions, AddExplain, RunExplain>());
+  Add(kKnowing, Make<DescribeOptions, AddDescribe, RunDescribe>());
+  Add(kKnowing, Make<ConfigOptions, AddConfig, RunConfig>());
+  Add(kKnowing, Make<StatsOptions, AddStats, RunStats>());
+  Add(kKeeping, Make<SimOptions, AddSim, RunSim>());
+  Add(kKeeping, Make<RunOptions, AddRun, RunRun>());
+  Add(kKeeping, Make<DemoOptions, AddDemo, RunDemo>());
+  // The demonstration's own other processes.
+  Add(kHidden, Make<DemoDeviceOptions, AddDemoDevice, RunDemoDeviceProcess>());
+  Add(kHidden, Make<DemoRestartedOptions, AddDemoRestarted, RunDemoRestartedProcess>());
 }
 
 CommandTree::~CommandTree() = default;
 
-void CommandTree::Add(std::unique_ptr<Command> command) {
+void CommandTree::Add(const char* group, std::unique_ptr<Command> command) {
   command->AddTo(app_.get());
   CLI::App* const added = app_->get_subcommands({}).back();
+  added->group(group);
   added->footer(added->get_footer() + "\n" + kFooter);
   entries_.push_back({added, std::move(command)});
 }

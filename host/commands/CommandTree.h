@@ -53,7 +53,8 @@ class CommandTree {
     std::unique_ptr<Command> command;
   };
 
-  void Add(std::unique_ptr<Command> command);
+  // The group is a heading in the list of commands; an empty one hides the command.
+  void Add(const char* group, std::unique_ptr<Command> command);
   Entry* Find(const std::string& name);
 
   std::unique_ptr<CLI::App> app_;

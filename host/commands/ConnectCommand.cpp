@@ -18,8 +18,8 @@ std::string TextOf(const std::string& state, const nlohmann::json& data) {
 
 void AddConnect(CLI::App* app, ConnectOptions* options) {
   CLI::App* const connect = app->add_subcommand("connect", "Open or close the port of a driver");
-  connect->add_option("STATE", options->state, "on, off or status")
-      ->type_name("")
+  connect->add_option("STATE", options->state, "What to do")
+      ->type_name("on|off|status")
       ->required()
       ->check(CLI::IsMember({"on", "off", "status"}).description(""));
   connect->add_flag("-j,--json", options->isJson, "As a JSON object");

@@ -5,6 +5,7 @@
 #include <cstdio>
 
 #include "host/base/ExitStatus.h"
+#include "host/commands/InstanceAccess.h"
 #include "host/framing/ConfigEdit.h"
 #include "host/framing/ConfigReport.h"
 #include "host/framing/DriverReplay.h"
@@ -100,9 +101,7 @@ void AddExplain(CLI::App* app, ExplainOptions* options) {
       ->type_name("CONFIG");
   explain->add_flag("--words", options->hasWords, "FILE holds words as above, # comments");
   explain->add_flag("-j,--json", options->isJson, "One JSON object a line");
-  explain->add_option("--color", options->colour, "auto, always or never")
-      ->type_name("WHEN")
-      ->check(CLI::IsMember({"auto", "always", "never"}).description(""));
+  AddColour(explain, &options->colour);
   explain->add_flag("--check", options->isChecked,
                     "Compare with the driver: status 7 if it differs");
   explain->add_option("--plugin", options->pluginFile, "Driver for --check")->type_name("FILE");

@@ -68,8 +68,8 @@ void AddRun(CLI::App* app, RunOptions* options) {
   CLI::App* const run = app->add_subcommand("run", "Own a port and stay, for others to attach");
   run->add_option("--ack", options->acknowledge,
                   "auto: take each token, publish and acknowledge it; never: leave that to others")
-      ->check(CLI::IsMember({"auto", "never"}))
-      ->type_name("WHO")
+      ->check(CLI::IsMember({"auto", "never"}).description(""))
+      ->type_name("auto|never")
       ->capture_default_str();
   AddInstanceAccess(run, &options->access);
   run->footer("Example: loka run --config scale.cfg /dev/ttyUSB0 --ack never");

@@ -108,7 +108,7 @@ void AddAsk(CLI::App* app, AskOptions* options) {
   ask->get_option_group("What to send")->require_option(1);
   ask->add_option("-W,--wait", options->limitSeconds, "Seconds to wait; exit status 27")
       ->type_name("S")
-      ->check(CLI::Range(0.001, 2000000.0))
+      ->check(CLI::Range(0.001, 2000000.0).description(""))
       ->capture_default_str();
   ask->add_flag("--fresh", options->isFresh, "Drop first what is waiting");
   CLI::Option* const json = ask->add_flag("-j,--json", options->isJson, "Answer as JSON");

@@ -18,6 +18,7 @@ bool MakePrintOptions(const SubOptions& options, PrintOptions* print, std::strin
   print->isRaw = options.isRaw;
   print->isQuiet = options.access.isQuiet;
   print->verbosity = options.access.verbosity;
+  print->colour = options.access.colour;
   if (options.isJson) {
     print->form = Form::kJson;
   } else if (options.isDump) {
@@ -38,7 +39,7 @@ void AddSub(CLI::App* app, SubOptions* options) {
   sub->add_option("-C,--count", options->count, "End after N tokens")->type_name("N");
   sub->add_option("-W,--wait", options->limitSeconds, "End after S seconds; exit status 27")
       ->type_name("S")
-      ->check(CLI::Range(0.001, kMaxLimitSeconds));
+      ->check(CLI::Range(0.001, kMaxLimitSeconds).description(""));
   CLI::Option* const format =
       sub->add_option("-F,--format", options->format,
                       "Line of a token: %t time %n number %l length %p payload %x hex %a waiting "
