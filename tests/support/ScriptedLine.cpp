@@ -51,6 +51,11 @@ bool ScriptedLine::IsExhausted() const {
   return exhausted_;
 }
 
+long long ScriptedLine::EventsLeft() const {
+  const std::lock_guard<std::mutex> guard(mutex_);
+  return static_cast<long long>(events_.size());
+}
+
 long long ScriptedLine::NowMs() const {
   const std::lock_guard<std::mutex> guard(mutex_);
   return nowMs_;

@@ -21,6 +21,9 @@ class ScriptedLine {
   // True once a receive has timed out behind the last scripted event.
   bool IsExhausted() const;
 
+  // Bytes and silences that are not received yet.
+  long long EventsLeft() const;
+
   long long NowMs() const;
 
   // A receive at the end of the script waits until more is fed or LetGo is called, instead of
