@@ -9,6 +9,7 @@
 
 #include "host/base/ExitStatus.h"
 #include "host/commands/CmdCommand.h"
+#include "host/commands/CompletionCommand.h"
 #include "host/commands/ConfigCommand.h"
 #include "host/commands/ConnectCommand.h"
 #include "host/commands/DemoCommand.h"
@@ -121,6 +122,8 @@ CommandTree::CommandTree()
   Add(kKeeping, Make<SimOptions, AddSim, RunSim>());
   Add(kKeeping, Make<RunOptions, AddRun, RunRun>());
   Add(kKeeping, Make<DemoOptions, AddDemo, RunDemo>());
+  Add(kKeeping, Make<CompletionOptions, AddCompletion, RunCompletion>());
+  Add(kHidden, Make<WordsOptions, AddWords, RunWords>());
   // The demonstration's own other processes.
   Add(kHidden, Make<DemoDeviceOptions, AddDemoDevice, RunDemoDeviceProcess>());
   Add(kHidden, Make<DemoRestartedOptions, AddDemoRestarted, RunDemoRestartedProcess>());
