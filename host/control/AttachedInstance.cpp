@@ -95,16 +95,23 @@ bool AttachedInstance::SendLine(const std::string& line) const {
   return true;
 }
 
-AttachedInstance::Received AttachedInstance::ReceiveLine(const Deadline& deadline,
+// `wakes`: a call of Wake ends the wait.
+AttachedInstance::Received AttachedInstance::ReceiveLine(const Deadline& deadline, bool wakes,
                                                          std::string* line) {
   while (!input_.Next(line)) {
-    std::array<pollfd, 2> waits = {{{descriptor_, POLLIN, 0}, {stop_.FileDescriptor(), POLLIN, 0}}};
-    const int ready = deadline.Poll(waits.data(), waits.size());
+    std::array<pollfd, 3> waits = {{{descriptor_, POLLIN, 0},
+                                    {stop_.FileDescriptor(), POLLIN, 0},
+                                    {wake_.FileDescriptor(), POLLIN, 0}}};
+    const int ready = deadline.Poll(waits.data(), wakes ? waits.size() : waits.size() - 1);
     if (ready == 0) {
       return Received::kTimeout;
     }
     if ((waits[1].revents & POLLIN) != 0) {
       return Received::kStop;
+    }
+    if ((waits[2].revents & POLLIN) != 0) {
+      wake_.Clear();
+      return Received::kWoken;
     }
     std::array<char, 65536> bytes{};
     const ssize_t count = recv(descriptor_, bytes.data(), bytes.size(), 0);
@@ -128,7 +135,7 @@ Answer AttachedInstance::Call(const Json& request) {
   const Deadline deadline = Deadline::After(kAnswerLimitMs);
   std::string line;
   for (;;) {
-    const Received received = ReceiveLine(deadline, &line);
+    const Received received = ReceiveLine(deadline, false, &line);
     if (received == Received::kStop) {
       return Refusal("", ExitStatus::kPortLost);
     }
@@ -176,7 +183,7 @@ Answer AttachedInstance::Serve(EventSink* sink, const std::function<bool()>& isD
       continue;
     }
     HostEvent event;
-    switch (ReceiveLine(deadline, &line)) {
+    switch (ReceiveLine(deadline, true, &line)) {
       case Received::kLine:
         if (FromJson(Json::parse(line, nullptr, false), &event)) {
           events_.push_back(event);
@@ -188,6 +195,8 @@ Answer AttachedInstance::Serve(EventSink* sink, const std::function<bool()>& isD
         return Refusal("the running instance has ended", ExitStatus::kPortLost);
       case Received::kStop:
         return {};
+      case Received::kWoken:
+        break;
     }
   }
   return {};

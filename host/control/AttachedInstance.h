@@ -30,6 +30,7 @@ class AttachedInstance final : public Instance {
   Answer Subscribe() override;
   Answer Serve(EventSink* sink, const std::function<bool()>& isDone,
                const Deadline& deadline) override;
+  void Wake() override { wake_.Raise(); }
   std::string Port() const override { return port_; }
 
   // What the instance said about itself: the data of the request "info".
@@ -41,11 +42,12 @@ class AttachedInstance final : public Instance {
   explicit AttachedInstance(int descriptor);
 
   bool SendLine(const std::string& line) const;
-  enum class Received { kLine, kTimeout, kGone, kStop };
-  Received ReceiveLine(const Deadline& deadline, std::string* line);
+  enum class Received { kLine, kTimeout, kGone, kStop, kWoken };
+  Received ReceiveLine(const Deadline& deadline, bool wakes, std::string* line);
 
   const int descriptor_;
   EventSignal stop_;  // raised once a signal asked to stop
+  EventSignal wake_;  // raised until Serve has seen it
   std::string port_;
   Answer info_;
   LineBuffer input_;

@@ -29,6 +29,9 @@ class Instance {
   virtual Answer Serve(EventSink* sink, const std::function<bool()>& isDone,
                        const Deadline& deadline) = 0;
 
+  // Makes Serve ask isDone now, or once when it is called next. Any thread.
+  virtual void Wake() = 0;
+
   // The port's name in the configuration, "com1".
   virtual std::string Port() const = 0;
 

@@ -38,6 +38,7 @@ class LocalInstance final : public Instance {
   Answer Subscribe() override;
   Answer Serve(EventSink* sink, const std::function<bool()>& isDone,
                const Deadline& deadline) override;
+  void Wake() override { intake_.Wake(); }
   std::string Port() const override { return events_.Port(); }
   int StopSignal() const override { return intake_.StopSignal(); }
 

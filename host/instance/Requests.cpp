@@ -173,7 +173,7 @@ Answer Requests::Dispatch(const std::string& op, const Json& request) {
     Handler handler = nullptr;
     RequestKeys keys;
   };
-  static const std::array<Operation, 13> kOperations = {{
+  static const std::array<Operation, 14> kOperations = {{
       {"info", &Requests::HandleInfo, {}},
       {"read", &Requests::HandleRead, {{"uri"}, {}}},
       {"write", &Requests::HandleWrite, {{"uri"}, {"value"}}},
@@ -187,6 +187,7 @@ Answer Requests::Dispatch(const std::string& op, const Json& request) {
       {"done", &Requests::HandleDone, {}},
       {"connect", &Requests::HandleConnect, {{"state"}, {}}},
       {"stats", &Requests::HandleStats, {}},
+      {"lines", &Requests::HandleLines, {}},
   }};
   for (const Operation& operation : kOperations) {
     if (op != operation.name) {
@@ -569,6 +570,16 @@ Answer Requests::HandleStats(const Json& /*request*/) {
                                   {"overruns", counters.lineErrors.overruns},
                                   {"breaks", counters.lineErrors.breaks},
                                   {"buffer_overruns", counters.lineErrors.bufferOverruns}};
+  }
+  return answer;
+}
+
+Answer Requests::HandleLines(const Json& /*request*/) {
+  Answer answer;
+  const ModemLines lines = session_->LinesOf(events_->Port());
+  if (lines.areKnown) {
+    answer.data = {{"dtr", lines.dtr}, {"rts", lines.rts}, {"cts", lines.cts},
+                   {"dsr", lines.dsr}, {"dcd", lines.dcd}, {"ri", lines.ri}};
   }
   return answer;
 }

@@ -37,6 +37,7 @@ class Statistics;
 //                                        a write to SP_Done
 //   stats                                as Statistics writes them; lost_send_bytes, lost_ms,
 //                                        echo_mismatches, line_errors (where the line counts)
+//   lines                                dtr, rts, cts, dsr, dcd, ri (where the line has them)
 //   connect    state: on, off or status  connected, changed
 //
 // Values, lines and replies may hold any byte and travel as hexadecimal digits, except the values
@@ -98,6 +99,7 @@ class Requests {
   Answer HandleDone(const nlohmann::json& request);
   Answer HandleConnect(const nlohmann::json& request);
   Answer HandleStats(const nlohmann::json& request);
+  Answer HandleLines(const nlohmann::json& request);
 
   std::unique_ptr<HostTag> MakeTag(const std::string& uri, Answer* answer);
   Answer Read(const std::string& uri);

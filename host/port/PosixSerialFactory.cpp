@@ -130,6 +130,14 @@ PortCounters PosixSerialFactory::CountersFor(const std::string& portName) const 
   return sum;
 }
 
+ModemLines PosixSerialFactory::LinesOf(const std::string& portName) const {
+  const std::lock_guard<std::mutex> lock(mutex_);
+  const auto found = std::find_if(open_.begin(), open_.end(), [&](const OpenPortEntry& entry) {
+    return entry.name == portName;
+  });
+  return found == open_.end() ? ModemLines() : found->port->Lines();
+}
+
 bool PosixSerialFactory::IsGone(const std::string& portName) const {
   const std::lock_guard<std::mutex> lock(mutex_);
   return std::any_of(open_.begin(), open_.end(), [&](const OpenPortEntry& entry) {

@@ -8,6 +8,7 @@
 #include <string>
 #include <vector>
 
+#include "host/port/ModemLines.h"
 #include "host/port/PortCounters.h"
 #include "host/port/PortMap.h"
 #include "host/port/PortObserver.h"
@@ -50,6 +51,9 @@ class PosixSerialFactory final : public ISerialFactory {
 
   // The counts of all ports that were opened under this name, together.
   PortCounters CountersFor(const std::string& portName) const;
+
+  // The modem lines of the open port of this name; not known without one.
+  ModemLines LinesOf(const std::string& portName) const;
 
   // Whether the port of this name is lost for good (reconnect=off).
   bool IsGone(const std::string& portName) const;

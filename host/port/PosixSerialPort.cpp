@@ -94,6 +94,11 @@ PortCounters PosixSerialPort::Counters() const {
   return counters;
 }
 
+ModemLines PosixSerialPort::Lines() const {
+  const std::shared_ptr<SerialDevice> device = CurrentDevice();
+  return device == nullptr ? ModemLines() : device->Lines();
+}
+
 int PosixSerialPort::Setup(int baudrate, int parity, int dataBits, int stopBits, int mode) {
   const CallGuard guard(&callsInside_);
   const LineSettings settings{baudrate, parity, dataBits, stopBits, mode};

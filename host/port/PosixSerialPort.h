@@ -17,6 +17,7 @@
 #include "host/port/EchoFilter.h"
 #include "host/port/EventSignal.h"
 #include "host/port/LineSettings.h"
+#include "host/port/ModemLines.h"
 #include "host/port/PortCounters.h"
 #include "host/port/PortObserver.h"
 #include "host/port/PortOptions.h"
@@ -84,6 +85,9 @@ class PosixSerialPort final : public ISerialPort {
 
   // Counts since the port was opened. Any thread.
   PortCounters Counters() const;
+
+  // The levels of the modem lines; not known while the line is lost. Any thread.
+  ModemLines Lines() const;
 
   // Whether there is no line now, and whether it will stay so (reconnect=off). Any thread.
   bool IsLost() const { return isLost_.load(); }

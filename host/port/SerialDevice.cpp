@@ -254,6 +254,22 @@ bool SerialDevice::SetRts(bool isOn) const {
   return calls_.Ioctl(fileDescriptor_, isOn ? TIOCMBIS : TIOCMBIC, &bit) == 0;
 }
 
+ModemLines SerialDevice::Lines() const {
+  ModemLines lines;
+  int bits = 0;
+  if (calls_.Ioctl(fileDescriptor_, TIOCMGET, &bits) != 0) {
+    return lines;
+  }
+  lines.areKnown = true;
+  lines.dtr = (bits & TIOCM_DTR) != 0;
+  lines.rts = (bits & TIOCM_RTS) != 0;
+  lines.cts = (bits & TIOCM_CTS) != 0;
+  lines.dsr = (bits & TIOCM_DSR) != 0;
+  lines.dcd = (bits & TIOCM_CAR) != 0;
+  lines.ri = (bits & TIOCM_RNG) != 0;
+  return lines;
+}
+
 int SerialDevice::PendingBytes() const {
   int pending = 0;
   return calls_.Ioctl(fileDescriptor_, TIOCOUTQ, &pending) == 0 ? pending : 0;

@@ -9,6 +9,7 @@
 #include <vector>
 
 #include "host/port/LineSettings.h"
+#include "host/port/ModemLines.h"
 #include "host/port/PortCounters.h"
 #include "host/port/PortOptions.h"
 #include "host/port/PortProblem.h"
@@ -52,6 +53,9 @@ class SerialDevice {
   // thread.
   bool NeedsRts() const { return needsRts_.load(); }
   bool SetRts(bool isOn) const;
+
+  // The levels of the modem lines now. Any thread.
+  ModemLines Lines() const;
 
   // Waits until everything has left, the last stop bit included (tcdrain(3)). Any thread.
   void Drain() const { (void)calls_.Drain(fileDescriptor_); }

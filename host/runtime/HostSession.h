@@ -84,6 +84,9 @@ class HostSession {
   }
   bool IsPortGone(const std::string& portName) const { return serialFactory_.IsGone(portName); }
 
+  // The levels of the configured port's modem lines (see PosixSerialFactory).
+  ModemLines LinesOf(const std::string& portName) const { return serialFactory_.LinesOf(portName); }
+
   // Why a port could not be opened or set up the last time (see PosixSerialFactory::LastProblem).
   PortProblem LastPortProblem() const { return serialFactory_.LastProblem(); }
 

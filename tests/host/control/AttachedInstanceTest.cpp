@@ -1,6 +1,9 @@
 // SPDX-License-Identifier: Apache-2.0
 #include <gtest/gtest.h>
 
+#include <atomic>
+#include <thread>
+
 #include "host/control/AttachedInstance.h"
 #include "host/control/ControlServer.h"
 #include "host/events/EventSink.h"
@@ -103,6 +106,22 @@ TEST_F(AttachedInstanceTest, ServesEventsAlsoThoseThatCameBetween) {
   const Answer tooLate = instance->Serve(
       &log, [] { return false; }, Deadline::After(0));
   EXPECT_EQ(tooLate.status, ExitStatus::kTimeout);
+}
+
+TEST_F(AttachedInstanceTest, AWakeUpMakesServeAskWhetherItIsDone) {
+  Listen();
+  const auto instance = Attach();
+  ASSERT_NE(instance, nullptr) << error_;
+  std::atomic<bool> isDone{false};
+  NoteLog log;
+  std::thread other([&] {
+    isDone.store(true);
+    instance->Wake();
+  });
+  const Answer served = instance->Serve(
+      &log, [&] { return isDone.load(); }, Deadline::After(kLimitMs));
+  EXPECT_TRUE(served.IsDone()) << served.text;
+  other.join();
 }
 
 TEST_F(AttachedInstanceTest, NoticesTheEndOfTheInstance) {

@@ -94,6 +94,13 @@ class RequestsTest : public testing::Test {
   std::unique_ptr<LocalInstance> instance_;
 };
 
+TEST_F(RequestsTest, ALineWithoutModemLinesTellsNoLevels) {
+  Open("");
+  const Answer answer = Call({{"op", "lines"}});
+  EXPECT_TRUE(answer.IsDone());
+  EXPECT_EQ(answer.data, Json::object());
+}
+
 TEST_F(RequestsTest, RefusesWhatIsNoRequest) {
   Open("");
   const std::string deep = std::string(1000, '[') + std::string(1000, ']');

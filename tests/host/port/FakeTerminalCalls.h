@@ -22,6 +22,7 @@ class FakeTerminalCalls final : public TerminalCalls {
 
   // What was asked, in order: "dtr+", "rts-", "drain", "flush", "rs485 on".
   mutable std::vector<std::string> asked;
+  int modemBits = 0;  // what TIOCMGET tells
   mutable termios line{};
   mutable serial_icounter_struct counts{};
   mutable serial_struct serial{};
@@ -32,6 +33,8 @@ class FakeTerminalCalls final : public TerminalCalls {
       case TIOCMBIS:
       case TIOCMBIC:
         return SetModemLines(*static_cast<const int*>(argument), request == TIOCMBIS ? "+" : "-");
+      case TIOCMGET:
+        return hasModemLines ? Give(modemBits, argument) : Fail();
       case TIOCGRS485:
         return hasRs485 ? Give(rs485, argument) : Fail();
       case TIOCSRS485:

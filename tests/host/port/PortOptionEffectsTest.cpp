@@ -74,6 +74,23 @@ TEST_F(PortOptionEffectsTest, SaysWhenALineHasNoModemLines) {
   EXPECT_EQ(observer_.Notes()[1].rfind(line_.Path() + ": rts=on has no effect", 0), 0U);
 }
 
+TEST_F(PortOptionEffectsTest, TellsTheLevelsOfTheModemLines) {
+  Open("");
+  for (const int bit : {TIOCM_DTR, TIOCM_RTS, TIOCM_CTS, TIOCM_DSR, TIOCM_CAR, TIOCM_RNG}) {
+    calls_.modemBits = bit;
+    const ModemLines lines = port_->Lines();
+    EXPECT_TRUE(lines.areKnown);
+    EXPECT_EQ(lines.dtr, bit == TIOCM_DTR);
+    EXPECT_EQ(lines.rts, bit == TIOCM_RTS);
+    EXPECT_EQ(lines.cts, bit == TIOCM_CTS);
+    EXPECT_EQ(lines.dsr, bit == TIOCM_DSR);
+    EXPECT_EQ(lines.dcd, bit == TIOCM_CAR);
+    EXPECT_EQ(lines.ri, bit == TIOCM_RNG);
+  }
+  calls_.hasModemLines = false;
+  EXPECT_FALSE(port_->Lines().areKnown);
+}
+
 TEST_F(PortOptionEffectsTest, FlowControlAndClosingStandInTheLine) {
   Open(",flow=rtscts,hupcl=off");
   ASSERT_EQ(SetLine(kModeRs232), 1);
