@@ -4,6 +4,7 @@
 #include <CLI/CLI.hpp>
 #include <limits>
 
+#include "host/commands/StatsText.h"
 #include "host/control/ControlPath.h"
 #include "host/events/EventSink.h"
 #include "host/events/EventText.h"
@@ -35,32 +36,6 @@ class LogPrinter final : public EventSink {
  private:
   const int verbosity_;
 };
-
-std::string CountText(const nlohmann::json& data, const char* key) {
-  return std::to_string(data.value(key, std::uint64_t{0}));
-}
-
-void PrintStats(const nlohmann::json& data) {
-  std::string drops;
-  std::uint64_t dropCount = 0;
-  for (const auto& [reason, count] : data.at("drops").items()) {
-    drops +=
-        (drops.empty() ? "" : ", ") + reason + " " + std::to_string(count.get<std::uint64_t>());
-    dropCount += count.get<std::uint64_t>();
-  }
-  std::string text = "tokens " + CountText(data, "tokens");
-  text += "  dropped " + std::to_string(dropCount) + (drops.empty() ? "" : " (" + drops + ")");
-  if (data.contains("line_errors")) {
-    const nlohmann::json& errors = data["line_errors"];
-    text += "  framing errors " + CountText(errors, "framing");
-    text += "  parity errors " + CountText(errors, "parity");
-    text += "  overruns " + CountText(errors, "overruns");
-  }
-  text += "  lost sends " + CountText(data, "lost_sends");
-  text += "  reconnects " + CountText(data, "reconnects");
-  text += "  findings " + CountText(data, "findings");
-  (void)WriteResult(text + "\n");
-}
 
 }  // namespace
 
@@ -122,7 +97,7 @@ int RunStats(StatsOptions* options) {
   if (options->isJson) {
     (void)WriteResult(JsonLine(answer.data) + "\n");
   } else {
-    PrintStats(answer.data);
+    (void)WriteResult(StatsText(answer.data) + "\n");
   }
   return 0;
 }

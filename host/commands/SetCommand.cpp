@@ -6,7 +6,6 @@
 
 #include "host/commands/SettingText.h"
 #include "host/commands/SettingWord.h"
-#include "host/commands/TextTable.h"
 #include "host/control/AttachedInstance.h"
 #include "host/events/JsonLine.h"
 #include "host/instance/TrapHints.h"
@@ -87,28 +86,18 @@ Answer Apply(Instance* instance, const SetOptions& options,
   return answer;
 }
 
-std::string Cell(const Json& row, const char* key) {
-  return row.contains(key) ? PrintableUtf8(row.value(key, "")) : "-";
-}
-
 Answer Show(Instance* instance, const SetOptions& options) {
   Answer answer = instance->Call({{"op", "settings"}});
   if (!answer.IsDone()) {
     return answer;
   }
-  std::vector<std::vector<std::string>> cells = {
-      {"setting", "configured", "active", "staged", "stored"}};
+  const SettingRows rows = answer.data.value("rows", SettingRows());
   std::string lines;
-  for (const Json& row : answer.data.value("rows", Json::array())) {
-    cells.push_back({Cell(row, "key"), Cell(row, "configured"), Cell(row, "active"),
-                     Cell(row, "staged"), Cell(row, "stored")});
+  for (const Json& row : rows) {
     lines += JsonLine(row) + "\n";
-    if (row.contains("console")) {
-      answer.hints.push_back(row.value("key", "") + " " + row.value("console", "") +
-                             ", set on the console, is in effect until SP_Done or a restart");
-    }
   }
-  if (!WriteResult(options.isJson ? lines : TextTable(cells))) {
+  AddConsoleHints(rows, &answer.hints);
+  if (!WriteResult(options.isJson ? lines : SettingsTable(rows))) {
     answer.status = ExitStatus::kRefused;
   }
   return answer;

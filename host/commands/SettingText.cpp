@@ -5,7 +5,9 @@
 #include <cstdint>
 #include <nlohmann/json.hpp>
 
+#include "host/commands/TextTable.h"
 #include "host/instance/SettingTable.h"
+#include "host/text/Utf8Text.h"
 
 namespace {
 
@@ -24,6 +26,10 @@ void Append(const std::string& part, std::string* text) {
 std::string Describe(const Json& row, const char* formerKey, const char* formerWord) {
   return row.value("key", "") + " " + row.value("value", "") + " (" + formerWord + " " +
          row.value(formerKey, "") + ")";
+}
+
+std::string Cell(const Json& row, const char* key) {
+  return row.contains(key) ? PrintableUtf8(row.value(key, "")) : "-";
 }
 
 }  // namespace
@@ -60,4 +66,23 @@ std::string AlsoAppliedText(const Json& data, const std::vector<std::string>& ex
     }
   }
   return text;
+}
+
+std::string SettingsTable(const SettingRows& rows) {
+  std::vector<std::vector<std::string>> cells = {
+      {"setting", "configured", "active", "staged", "stored"}};
+  for (const Json& row : rows) {
+    cells.push_back({Cell(row, "key"), Cell(row, "configured"), Cell(row, "active"),
+                     Cell(row, "staged"), Cell(row, "stored")});
+  }
+  return TextTable(cells);
+}
+
+void AddConsoleHints(const SettingRows& rows, std::vector<std::string>* hints) {
+  for (const Json& row : rows) {
+    if (row.contains("console")) {
+      hints->push_back(row.value("key", "") + " " + row.value("console", "") +
+                       ", set on the console, is in effect until SP_Done or a restart");
+    }
+  }
 }

@@ -19,3 +19,10 @@ std::string AppliedText(const nlohmann::json& data);
 
 // "baud 19200 (was 9600)" for each applied setting whose key is not in `expected`; empty for none.
 std::string AlsoAppliedText(const nlohmann::json& data, const std::vector<std::string>& expected);
+
+// A heading and a line a setting, from the rows of the request "settings": configured, active,
+// staged and stored value.
+std::string SettingsTable(const SettingRows& rows);
+
+// One hint for each of these rows whose value in effect was set on the driver's console.
+void AddConsoleHints(const SettingRows& rows, std::vector<std::string>* hints);
