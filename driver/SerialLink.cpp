@@ -1,8 +1,6 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "driver/SerialLink.h"
 
-#include <exception>
-
 #include "interfaces/ISerialFactory.h"
 #include "interfaces/ISerialPort.h"
 
@@ -19,6 +17,7 @@ bool SerialLink::Open(const std::string& portName, const SerialSettings& setting
   if (connected_) {
     return true;
   }
+  Ports place(1);
   ISerialPort* port = factory_ == nullptr ? nullptr : factory_->OpenPort(portName.c_str());
   if (port == nullptr) {
     return false;
@@ -31,6 +30,8 @@ bool SerialLink::Open(const std::string& portName, const SerialSettings& setting
   {
     const LeafLock lock(useMutex_);
     if (port_ == nullptr) {
+      const LeafLock passLock(passMutex_);
+      places_.splice(places_.end(), place);
       port_ = port;
     } else {
       surplus = port;  // another thread opened the link meanwhile
@@ -53,11 +54,18 @@ void SerialLink::Release(ISerialPort* port) {
   }
 }
 
-void SerialLink::Close() { Release(TakePort()); }
+void SerialLink::Close() {
+  ISerialPort* port = TakePort();
+  if (port != nullptr) {
+    DropPlace();
+    Release(port);
+  }
+}
 
 void SerialLink::CloseWithoutSemaphore() {
   ISerialPort* port = TakePort();
   if (port != nullptr && !KeepForPass(port)) {
+    DropPlace();
     Release(port);
   }
 }
@@ -96,7 +104,7 @@ void SerialLink::BeginPass() {
 }
 
 void SerialLink::EndPass() {
-  std::vector<ISerialPort*> ports;
+  Ports ports;
   {
     const LeafLock lock(passMutex_);
     isPassRunning_ = false;
@@ -107,16 +115,20 @@ void SerialLink::EndPass() {
   }
 }
 
-// Leaves the port to the receive pass that is running. False when none is, or without memory.
+// Leaves the port to the receive pass that is running. False when none is.
 bool SerialLink::KeepForPass(ISerialPort* port) {
   const LeafLock lock(passMutex_);
   if (!isPassRunning_) {
     return false;
   }
-  try {
-    releaseAfterPass_.push_back(port);
-  } catch (const std::exception&) {
-    return false;
-  }
+  places_.front() = port;
+  releaseAfterPass_.splice(releaseAfterPass_.end(), places_, places_.begin());
   return true;
+}
+
+// Gives up the place of a port that is not kept.
+void SerialLink::DropPlace() {
+  Ports dropped;  // freed without holding the lock
+  const LeafLock lock(passMutex_);
+  dropped.splice(dropped.end(), places_, places_.begin());
 }

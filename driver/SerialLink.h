@@ -2,8 +2,8 @@
 #pragma once
 
 #include <atomic>
+#include <list>
 #include <string>
-#include <vector>
 
 #include "driver/SerialSettings.h"
 #include "protlib/LeafMutex.h"
@@ -27,7 +27,8 @@ class SerialLink {
   bool IsConnected() const { return connected_; }
 
   // Opens the named port and sets it up. True when the port is open afterwards, also when it
-  // already was. A port that cannot be set up is released again.
+  // already was. A port that cannot be set up is released again. Throws std::bad_alloc, and has
+  // then opened nothing.
   bool Open(const std::string& portName, const SerialSettings& settings);
 
   // Marks the link as closed without touching the port: a receive pass ends at its next byte.
@@ -67,10 +68,13 @@ class SerialLink {
   };
 
  private:
+  using Ports = std::list<ISerialPort*>;
+
   ISerialPort* TakePort();
   void BeginPass();
   void EndPass();
   bool KeepForPass(ISerialPort* port);
+  void DropPlace();
   void Release(ISerialPort* port);
 
   ISerialFactory* const factory_;
@@ -84,5 +88,7 @@ class SerialLink {
 
   LeafMutex passMutex_;
   bool isPassRunning_ LOKA_GUARDED_BY(passMutex_) = false;
-  std::vector<ISerialPort*> releaseAfterPass_ LOKA_GUARDED_BY(passMutex_);
+  Ports releaseAfterPass_ LOKA_GUARDED_BY(passMutex_);
+  // One for each open port, made when it is opened: to keep a port for the pass needs no memory.
+  Ports places_ LOKA_GUARDED_BY(passMutex_);
 };

@@ -6,6 +6,7 @@
 #include <functional>
 #include <memory>
 #include <mutex>
+#include <new>
 #include <string>
 #include <thread>
 #include <vector>
@@ -274,15 +275,29 @@ TEST_F(SerialLinkTest, CloseUnderTheSemaphoreReleasesAtOnceEvenInAPass) {
   EXPECT_EQ(factory_.Port().releases, 1);
 }
 
-TEST_F(SerialLinkTest, WithoutMemoryToKeepThePortItIsReleased) {
+TEST_F(SerialLinkTest, KeepingThePortForAPassNeedsNoMemory) {
   link_.Open("com7", kSettings);
-  const SerialLink::ReceivePass pass(link_);
   {
-    const FailingNew noMemory(1);
-    link_.CloseWithoutSemaphore();
-    EXPECT_TRUE(noMemory.HasFailed());
+    const SerialLink::ReceivePass pass(link_);
+    {
+      const FailingNew noMemory(1);
+      link_.CloseWithoutSemaphore();
+      EXPECT_FALSE(noMemory.HasFailed());
+    }
+    EXPECT_EQ(factory_.Port().releases, 0);
   }
   EXPECT_EQ(factory_.Port().releases, 1);
+}
+
+TEST_F(SerialLinkTest, WithoutMemoryNothingIsOpened) {
+  {
+    const FailingNew noMemory(1);
+    EXPECT_THROW(link_.Open("com7", kSettings), std::bad_alloc);
+    EXPECT_TRUE(noMemory.HasFailed());
+  }
+  EXPECT_FALSE(link_.IsConnected());
+  EXPECT_EQ(factory_.OpenCount(), 0);
+  EXPECT_TRUE(link_.Open("com7", kSettings));
 }
 
 // --- set-up, send, receive ---
