@@ -13,10 +13,6 @@ extern "C" IInterfaceFactory* GetInterfaceFactory();
 
 namespace {
 
-// Passes in which nothing is received, after which nobody is taken to listen. A silence of the line
-// may end that many passes.
-constexpr int kIdlePasses = 50;
-
 template <typename Interface>
 Interface* Ask(const char* name) {
   IInterface* const object = GetInterfaceFactory()->CreateInterface(name);
@@ -65,19 +61,8 @@ void FuzzedDriver::Run(const std::string& more) {
 }
 
 void FuzzedDriver::Receive(const std::string& bytes) {
-  ScriptedLine& line = host_.Line();
-  line.Feed(bytes);
-  ScriptedTask* const task = host_.MultiTask().LastTask();
-  if (task == nullptr || task->IsEnded()) return;
-  // Nobody may listen, or at another port; the line would then never fall silent.
-  int idle = 0;
-  long long before = line.EventsLeft();
-  task->RunUntil([&] {
-    const long long left = line.EventsLeft();
-    idle = left == before ? idle + 1 : 0;
-    before = left;
-    return line.IsExhausted() || idle > kIdlePasses;
-  });
+  host_.Line().Feed(bytes);
+  host_.RunUntilSilent();
 }
 
 FuzzedRead FuzzedDriver::Read(const ITag* tag) {

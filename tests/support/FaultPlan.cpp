@@ -16,12 +16,19 @@ void FaultPlan::FailNthOfAll(int nth) {
   nthOfAll_ = nth;
 }
 
+void FaultPlan::FailAllFrom(int nth) {
+  const std::lock_guard<std::mutex> guard(mutex_);
+  allFrom_ = nth;
+}
+
 void FaultPlan::Clear() {
   const std::lock_guard<std::mutex> guard(mutex_);
   nth_.clear();
   always_.clear();
   counts_.clear();
   nthOfAll_ = 0;
+  allFrom_ = 0;
+  failed_ = 0;
   total_ = 0;
 }
 
@@ -29,12 +36,20 @@ bool FaultPlan::IsToFail(const std::string& operation) {
   const std::lock_guard<std::mutex> guard(mutex_);
   const int nth = ++counts_[operation];
   ++total_;
-  if (total_ == nthOfAll_ || always_.count(operation) != 0) return true;
   const auto found = nth_.find(operation);
-  return found != nth_.end() && found->second.count(nth) != 0;
+  const bool isToFail = total_ == nthOfAll_ || (allFrom_ != 0 && total_ >= allFrom_) ||
+                        always_.count(operation) != 0 ||
+                        (found != nth_.end() && found->second.count(nth) != 0);
+  failed_ += isToFail ? 1 : 0;
+  return isToFail;
 }
 
 int FaultPlan::CallCount() const {
   const std::lock_guard<std::mutex> guard(mutex_);
   return total_;
+}
+
+int FaultPlan::FailedCount() const {
+  const std::lock_guard<std::mutex> guard(mutex_);
+  return failed_;
 }

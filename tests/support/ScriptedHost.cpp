@@ -1,6 +1,33 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "tests/support/ScriptedHost.h"
 
+#include "tests/support/HostCall.h"
+
+namespace {
+
+// Says when a line has nothing to give any more.
+class LineWatch {
+ public:
+  explicit LineWatch(const ScriptedLine& line) : line_(line) {}
+
+  // Asked in front of every pass. Nobody may listen any more: after a while without anything taken
+  // the line counts as silent, too.
+  bool IsSilent() {
+    constexpr int kMostIdlePasses = 50;
+    const long long progress = line_.NowMs() - line_.EventsLeft();
+    idlePasses_ = progress == before_ ? idlePasses_ + 1 : 0;
+    before_ = progress;
+    return line_.IsExhausted() || idlePasses_ > kMostIdlePasses;
+  }
+
+ private:
+  const ScriptedLine& line_;
+  int idlePasses_ = 0;
+  long long before_ = -1;
+};
+
+}  // namespace
+
 ScriptedHost::ScriptedHost()
     : multiTask_(log_, faults_),
       serialFactory_(log_, faults_),
@@ -22,6 +49,7 @@ ScriptedHost::ScriptedHost()
                 {"IFastTimer", &fastTimer_}} {}
 
 IInterface* ScriptedHost::CreateInterface(const char* name) {
+  const HostCall inside;
   const std::string asked = name != nullptr ? name : "(null)";
   const auto found = services_.find(asked);
   const bool given =
@@ -33,6 +61,7 @@ IInterface* ScriptedHost::CreateInterface(const char* name) {
 }
 
 void ScriptedHost::ReleaseInterface(IInterface* interface) {
+  const HostCall inside;
   for (const auto& [name, service] : services_) {
     if (service != interface) continue;
     log_.Add("ReleaseInterface " + name);
@@ -43,11 +72,10 @@ void ScriptedHost::ReleaseInterface(IInterface* interface) {
 }
 
 void ScriptedHost::RunUntilSilent(const std::string& port) {
-  ScriptedLine& line = Line(port);
   ScriptedTask* task = multiTask_.LastTask();
-  if (task != nullptr && !task->IsEnded()) {
-    task->RunUntil([&line] { return line.IsExhausted(); });
-  }
+  if (task == nullptr || task->IsEnded()) return;
+  LineWatch watch(Line(port));
+  task->RunUntil([&watch] { return watch.IsSilent(); });
 }
 
 void ScriptedHost::RunPasses(int count) {

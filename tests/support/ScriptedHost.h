@@ -41,8 +41,9 @@ class ScriptedHost final : public IInterfaceFactory {
   void SetAbsent(const std::string& service) { absent_.insert(service); }
   void SetPresent(const std::string& service) { absent_.erase(service); }
 
-  // Manual host: runs the receive task on this thread until the line's script is used up. Without a
-  // task, or once it has been stopped, nothing runs.
+  // Manual host: runs the receive task on this thread until the line's script is used up, or until
+  // nobody has taken anything of it for a while. Without a task, or once it has been stopped, nothing
+  // runs.
   void RunUntilSilent(const std::string& port = "com1");
   void RunPasses(int count);
 

@@ -6,6 +6,7 @@
 #include <utility>
 
 #include "interfaces/CompareInterface.h"
+#include "tests/support/HostCall.h"
 #include "tests/support/ReceiveTaskMark.h"
 
 void* ScriptedMultiTask::ConvertTo(const char* name) {
@@ -18,6 +19,7 @@ void ScriptedMultiTask::reserved11() { log_.AddViolation("a reserved task operat
 void ScriptedMultiTask::reserved12() { log_.AddViolation("a reserved task operation was called"); }
 
 int ScriptedMultiTask::StopTask(ITask* task, int timeoutMs) {
+  const HostCall inside;
   ScriptedTask* known = nullptr;
   {
     const std::lock_guard<std::mutex> guard(mutex_);
@@ -40,6 +42,7 @@ int ScriptedMultiTask::StopTask(ITask* task, int timeoutMs) {
 }
 
 ISemaphore* ScriptedMultiTask::CreateSemaphore(int reserved) {
+  const HostCall inside;
   const std::lock_guard<std::mutex> guard(mutex_);
   const int index = createdSemaphores_++;
   const bool isQueue = index % 2 == 0;
@@ -57,6 +60,7 @@ ISemaphore* ScriptedMultiTask::CreateSemaphore(int reserved) {
 }
 
 void ScriptedMultiTask::DeleteSemaphore(ISemaphore* semaphore) {
+  const HostCall inside;
   const std::lock_guard<std::mutex> guard(mutex_);
   for (const auto& known : semaphores_) {
     if (known.get() != semaphore) continue;
@@ -68,6 +72,7 @@ void ScriptedMultiTask::DeleteSemaphore(ISemaphore* semaphore) {
 }
 
 void ScriptedMultiTask::Sleep(int milliseconds) {
+  const HostCall inside;
   log_.Add("Sleep " + std::to_string(milliseconds));
   std::function<void(int)> action;
   {
@@ -83,6 +88,7 @@ void ScriptedMultiTask::Sleep(int milliseconds) {
 }
 
 ITask* ScriptedMultiTask::CreateTask(ITaskRunner* runner, int taskClass) {
+  const HostCall inside;
   log_.Add("CreateTask " + std::to_string(taskClass));
   if (runner == nullptr) log_.AddViolation("CreateTask without a runner");
   if (faults_.IsToFail("CreateTask")) return nullptr;

@@ -5,6 +5,7 @@
 #include <utility>
 #include <vector>
 
+#include "tests/support/HostCall.h"
 #include "tests/support/ReceiveTaskMark.h"
 
 namespace {
@@ -39,6 +40,7 @@ void ScriptedSemaphore::CheckOrder() {
 }
 
 int ScriptedSemaphore::Lock() {
+  const HostCall inside;
   RunHook();
   CheckOrder();
   std::unique_lock<std::mutex> lock(mutex_);
@@ -57,6 +59,7 @@ int ScriptedSemaphore::Lock() {
 }
 
 int ScriptedSemaphore::Unlock() {
+  const HostCall inside;
   const std::lock_guard<std::mutex> guard(mutex_);
   if (!held_ || holder_ != std::this_thread::get_id()) {
     log_.AddViolation(name_ + ".Unlock by a thread that does not hold it");

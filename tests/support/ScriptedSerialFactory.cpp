@@ -2,12 +2,14 @@
 #include "tests/support/ScriptedSerialFactory.h"
 
 #include "interfaces/CompareInterface.h"
+#include "tests/support/HostCall.h"
 
 void* ScriptedSerialFactory::ConvertTo(const char* name) {
   return CompareInterface(name, "ISerialFactory") ? this : nullptr;
 }
 
 ISerialPort* ScriptedSerialFactory::OpenPort(const char* name) {
+  const HostCall inside;
   const std::string portName = name != nullptr ? name : "(null)";
   log_.Add("OpenPort " + portName);
   if (faults_.IsToFail("OpenPort")) return nullptr;
@@ -18,6 +20,7 @@ ISerialPort* ScriptedSerialFactory::OpenPort(const char* name) {
 }
 
 void ScriptedSerialFactory::ReleasePort(ISerialPort* port) {
+  const HostCall inside;
   const std::lock_guard<std::mutex> guard(mutex_);
   for (const auto& known : ports_) {
     if (known.get() != port) continue;

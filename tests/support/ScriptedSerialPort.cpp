@@ -4,6 +4,7 @@
 #include <utility>
 
 #include "tests/support/HexDump.h"
+#include "tests/support/HostCall.h"
 
 namespace {
 
@@ -36,6 +37,7 @@ void ScriptedSerialPort::CheckOpen(const char* operation) {
 }
 
 int ScriptedSerialPort::Setup(int baudrate, int parity, int dataBits, int stopBits, int mode) {
+  const HostCall inside;
   const UseCount use(users_);
   CheckOpen("Setup");
   log_.Add("Setup " + std::to_string(baudrate) + " " + std::to_string(parity) + " " +
@@ -44,6 +46,7 @@ int ScriptedSerialPort::Setup(int baudrate, int parity, int dataBits, int stopBi
 }
 
 int ScriptedSerialPort::Send(const unsigned char* data, int lengthBytes, int timeoutMs) {
+  const HostCall inside;
   const UseCount use(users_);
   CheckOpen("Send");
   std::string line = "Send";
@@ -58,6 +61,7 @@ int ScriptedSerialPort::Send(const unsigned char* data, int lengthBytes, int tim
 }
 
 int ScriptedSerialPort::Receive(unsigned char* byte, int timeoutMs, int reserved) {
+  const HostCall inside;
   const UseCount use(users_);
   CheckOpen("Receive");
   if (reserved != 0) log_.AddViolation("Receive with a last argument other than 0");

@@ -4,6 +4,7 @@
 #include <cstring>
 
 #include "interfaces/CompareInterface.h"
+#include "tests/support/HostCall.h"
 
 namespace {
 
@@ -17,6 +18,7 @@ std::string Text(const char* text) { return text != nullptr ? text : ""; }
 }  // namespace
 
 void* ScriptedStorage::ConvertTo(const char* name) {
+  const HostCall inside;
   const bool plain = CompareInterface(name, "IPermanentStorage");
   const bool extended =
       CompareInterface(name, "IPermanentStorage2") && extended_ && !faults_.IsToFail("ConvertTo");
@@ -30,16 +32,19 @@ void ScriptedStorage::Store(const char* ident, const char* key, Value value) {
 }
 
 void ScriptedStorage::SetString(const char* ident, const char* key, const char* text) {
+  const HostCall inside;
   log_.Add("SetString" + Address(ident, key) + " " + Text(text));
   Store(ident, key, {Value::Type::kString, false, 0, Text(text)});
 }
 
 void ScriptedStorage::SetBoolean(const char* ident, const char* key, bool value) {
+  const HostCall inside;
   log_.Add("SetBoolean" + Address(ident, key) + (value ? " true" : " false"));
   Store(ident, key, {Value::Type::kBoolean, value, 0, ""});
 }
 
 void ScriptedStorage::SetInteger(const char* ident, const char* key, int value) {
+  const HostCall inside;
   log_.Add("SetInteger" + Address(ident, key) + " " + std::to_string(value));
   Store(ident, key, {Value::Type::kInteger, false, value, ""});
 }
@@ -52,6 +57,7 @@ const ScriptedStorage::Value* ScriptedStorage::Find(const std::string& ident,
 }
 
 const char* ScriptedStorage::GetString(const char* ident, const char* key) {
+  const HostCall inside;
   const std::lock_guard<std::mutex> guard(mutex_);
   const Value* value =
       faults_.IsToFail("GetString") ? nullptr : Find(Text(ident), Text(key), Value::Type::kString);
@@ -61,6 +67,7 @@ const char* ScriptedStorage::GetString(const char* ident, const char* key) {
 }
 
 bool ScriptedStorage::GetBoolean(const char* ident, const char* key) {
+  const HostCall inside;
   const std::lock_guard<std::mutex> guard(mutex_);
   const Value* value = faults_.IsToFail("GetBoolean")
                            ? nullptr
@@ -71,6 +78,7 @@ bool ScriptedStorage::GetBoolean(const char* ident, const char* key) {
 }
 
 int ScriptedStorage::GetInteger(const char* ident, const char* key) {
+  const HostCall inside;
   const std::lock_guard<std::mutex> guard(mutex_);
   const Value* value = faults_.IsToFail("GetInteger")
                            ? nullptr
@@ -81,6 +89,7 @@ int ScriptedStorage::GetInteger(const char* ident, const char* key) {
 }
 
 int ScriptedStorage::Exists(const char* ident, const char* key) {
+  const HostCall inside;
   const std::lock_guard<std::mutex> guard(mutex_);
   const bool result = !faults_.IsToFail("Exists") && values_.count({Text(ident), Text(key)}) != 0;
   log_.Add("Exists" + Address(ident, key) + (result ? " -> 1" : " -> 0"));
@@ -89,6 +98,7 @@ int ScriptedStorage::Exists(const char* ident, const char* key) {
 
 int ScriptedStorage::GetStringInto(const char* ident, const char* key, char* buffer,
                                    int sizeBytes) {
+  const HostCall inside;
   const std::lock_guard<std::mutex> guard(mutex_);
   const Value* value = Find(Text(ident), Text(key), Value::Type::kString);
   const bool fits =

@@ -3,6 +3,7 @@
 
 #include <utility>
 
+#include "tests/support/HostCall.h"
 #include "tests/support/ReceiveTaskMark.h"
 
 ScriptedTask::ScriptedTask(CallLog& log, FaultPlan& faults, ITaskRunner* runner, bool threaded)
@@ -16,6 +17,7 @@ ScriptedTask::~ScriptedTask() {
 void* ScriptedTask::ConvertTo(const char* /*name*/) { return nullptr; }
 
 int ScriptedTask::IsToEnd() {
+  const HostCall inside;
   if (ended_ && !threaded_) log_.AddViolation("IsToEnd of a task that has been stopped");
   const bool toEnd = toEnd_ || (isDone_ && isDone_());
   log_.Add(toEnd ? "IsToEnd -> 1" : "IsToEnd -> 0");
@@ -25,6 +27,7 @@ int ScriptedTask::IsToEnd() {
 void ScriptedTask::reserved4() { log_.AddViolation("a reserved task operation was called"); }
 
 int ScriptedTask::Start() {
+  const HostCall inside;
   log_.Add("task.Start");
   if (started_) log_.AddViolation("a task was started twice");
   started_ = true;

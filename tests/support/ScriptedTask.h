@@ -33,6 +33,7 @@ class ScriptedTask final : public ITask {
   void End();
   // Asks only.
   void AskToEnd() { toEnd_ = true; }
+  bool IsAskedToEnd() const { return toEnd_; }
   bool IsEnded() const { return ended_; }
   bool IsStarted() const { return started_; }
 

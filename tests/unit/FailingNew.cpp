@@ -1,12 +1,17 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "tests/unit/FailingNew.h"
 
+#include <atomic>
 #include <cstddef>
 #include <cstdlib>
 #include <limits>
 #include <new>
 
+#include "tests/support/HostCall.h"
+
 namespace {
+
+std::atomic<long long> living{0};
 
 thread_local long long allocations = 0;
 thread_local int countdown = 0;  // 0: none fails
@@ -14,6 +19,7 @@ thread_local bool failsFromThenOn = false;
 thread_local bool failed = false;
 
 bool IsToFail() {
+  if (HostCall::IsInside()) return false;
   ++allocations;
   if (countdown == 0 || --countdown != 0) {
     return false;
@@ -27,8 +33,15 @@ bool IsToFail() {
 constexpr std::size_t kTooMuchBytes = std::numeric_limits<std::size_t>::max() / 4;
 
 void* Allocate(std::size_t sizeBytes) noexcept {
-  return IsToFail() || sizeBytes > kTooMuchBytes ? nullptr
-                                                 : std::malloc(sizeBytes == 0 ? 1 : sizeBytes);
+  if (IsToFail() || sizeBytes > kTooMuchBytes) return nullptr;
+  void* const memory = std::malloc(sizeBytes == 0 ? 1 : sizeBytes);
+  living += memory == nullptr ? 0 : 1;
+  return memory;
+}
+
+void Free(void* memory) noexcept {
+  living -= memory == nullptr ? 0 : 1;
+  std::free(memory);
 }
 
 void* AllocateOrThrow(std::size_t sizeBytes) {
@@ -53,6 +66,8 @@ bool FailingNew::HasFailed() const { return failed; }
 
 long long FailingNew::Count() { return allocations; }
 
+long long FailingNew::Living() { return living; }
+
 // The program's own allocation functions, replaced as the language allows
 // ([replacement.functions]).
 void* operator new(std::size_t sizeBytes) { return AllocateOrThrow(sizeBytes); }
@@ -63,9 +78,9 @@ void* operator new(std::size_t sizeBytes, const std::nothrow_t& /*tag*/) noexcep
 void* operator new[](std::size_t sizeBytes, const std::nothrow_t& /*tag*/) noexcept {
   return Allocate(sizeBytes);
 }
-void operator delete(void* memory) noexcept { std::free(memory); }
-void operator delete[](void* memory) noexcept { std::free(memory); }
-void operator delete(void* memory, std::size_t /*sizeBytes*/) noexcept { std::free(memory); }
-void operator delete[](void* memory, std::size_t /*sizeBytes*/) noexcept { std::free(memory); }
-void operator delete(void* memory, const std::nothrow_t& /*tag*/) noexcept { std::free(memory); }
-void operator delete[](void* memory, const std::nothrow_t& /*tag*/) noexcept { std::free(memory); }
+void operator delete(void* memory) noexcept { Free(memory); }
+void operator delete[](void* memory) noexcept { Free(memory); }
+void operator delete(void* memory, std::size_t /*sizeBytes*/) noexcept { Free(memory); }
+void operator delete[](void* memory, std::size_t /*sizeBytes*/) noexcept { Free(memory); }
+void operator delete(void* memory, const std::nothrow_t& /*tag*/) noexcept { Free(memory); }
+void operator delete[](void* memory, const std::nothrow_t& /*tag*/) noexcept { Free(memory); }

@@ -2,8 +2,9 @@
 #pragma once
 
 // Lets allocations of the calling thread fail while the object lives: the nth one from now (counted
-// from 1), or the nth and all that follow. Every allocation of the test program counts, so a test
-// keeps its own out of the object's life.
+// from 1), or the nth and all that follow. Every allocation of the program counts, those of a
+// library that it has loaded included, but not those of a scripted host; so a test keeps its own
+// out of the object's life.
 class FailingNew {
  public:
   enum class Mode { kOnce, kFromThenOn };
@@ -18,4 +19,7 @@ class FailingNew {
 
   // Number of allocations of the calling thread so far.
   static long long Count();
+
+  // Number of allocations of all threads, the host's included, that have not been freed.
+  static long long Living();
 };
