@@ -7,6 +7,7 @@
 
 #include "host/base/ExitStatus.h"
 #include "host/commands/CommandTree.h"
+#include "host/commands/ProfileFile.h"
 #include "host/completion/BashCompletion.h"
 #include "host/completion/CommandModel.h"
 #include "host/completion/FishCompletion.h"
@@ -32,6 +33,18 @@ Words Ports() {
     words.push_back(port.path);
     if (!port.alias.empty()) {
       words.push_back(port.alias);
+    }
+  }
+  return words;
+}
+
+Words NamesOfProfiles() {
+  std::vector<Profile> profiles;
+  std::string error;
+  Words words;
+  if (ReadProfiles(ProfileFiles(), &profiles, &error)) {
+    for (const Profile& profile : profiles) {
+      words.push_back(profile.name);
     }
   }
   return words;
@@ -78,6 +91,9 @@ Words Uris(const std::string& pluginFile) {
 Words WordsOf(const WordsOptions& options) {
   if (options.kind == "ports") {
     return Ports();
+  }
+  if (options.kind == "profiles") {
+    return NamesOfProfiles();
   }
   if (options.kind == "instances") {
     return ControlNames();

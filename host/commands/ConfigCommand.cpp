@@ -6,6 +6,8 @@
 #include <cstdio>
 
 #include "host/base/ExitStatus.h"
+#include "host/commands/ProfileFile.h"
+#include "host/commands/ProfileUse.h"
 #include "host/document/DescriptionBlock.h"
 #include "host/document/DescriptionDocument.h"
 #include "host/framing/ConfigEdit.h"
@@ -95,10 +97,40 @@ int New(const ConfigOptions& options) {
   return static_cast<int>(ExitStatus::kDone);
 }
 
+// One line a profile. What is wrong with one is told, and the others are listed all the same.
+int Profiles() {
+  std::vector<Profile> profiles;
+  std::string error;
+  if (!ReadProfiles(ProfileFiles(), &profiles, &error)) {
+    return Fail(ExitStatus::kUsage, error);
+  }
+  if (profiles.empty()) {
+    std::string files;
+    for (const std::string& file : ProfileFiles()) {
+      files += (files.empty() ? "" : " and ") + file;
+    }
+    TellUser("no profiles; they stand in " + files + ", see loka-config(5)");
+  }
+  auto status = ExitStatus::kDone;
+  for (const Profile& profile : profiles) {
+    std::string line = profile.name + "  " + profile.file;
+    for (const auto& [key, value] : profile.values) {
+      line += "  " + key + "=" + value;
+    }
+    (void)std::printf("%s\n", EscapeBytes(line).c_str());
+    if (!CheckProfile(profile, &error)) {
+      TellUser(error);
+      status = ExitStatus::kUsage;
+    }
+  }
+  return static_cast<int>(status);
+}
+
 }  // namespace
 
 void AddConfig(CLI::App* app, ConfigOptions* options) {
-  CLI::App* const config = app->add_subcommand("config", "Make, check or explain configurations");
+  CLI::App* const config =
+      app->add_subcommand("config", "Make, check or explain configurations, list profiles");
   config->require_subcommand(1);
   config->footer("Example: loka config new -b 9600 -d 7 -p even --rx-prefix STX --rx-suffix ETX");
   CLI::App* const make = config->add_subcommand("new", "Print a configuration made of flags");
@@ -113,10 +145,16 @@ void AddConfig(CLI::App* app, ConfigOptions* options) {
   CLI::App* const show = config->add_subcommand("show", "Explain a configuration key by key");
   AddInput(show, options, ConfigOptions::Action::kShow);
   show->footer("Example: loka config new -b 9600 --rx-suffix CR | loka config show -");
+  CLI::App* const profiles = config->add_subcommand("profiles", "List and check the profiles");
+  profiles->callback([options] { options->action = ConfigOptions::Action::kProfiles; });
+  profiles->footer("Example: loka config profiles");
 }
 
 int RunConfig(const ConfigOptions& options) {
   (void)std::setvbuf(stdout, nullptr, _IOLBF, BUFSIZ);
+  if (options.action == ConfigOptions::Action::kProfiles) {
+    return Profiles();
+  }
   if (options.action == ConfigOptions::Action::kNew) {
     return New(options);
   }

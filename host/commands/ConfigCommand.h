@@ -10,7 +10,7 @@ class App;
 }
 
 struct ConfigOptions {
-  enum class Action { kNew, kCheck, kShow };
+  enum class Action { kNew, kCheck, kShow, kProfiles };
 
   Action action = Action::kNew;
   FramingFlags framing;           // of "new"
@@ -18,10 +18,11 @@ struct ConfigOptions {
   std::string pluginFile;
 };
 
-// Adds the command "config" with "new", "check" and "show" below it. Parsing fills `options`, which
-// must outlive the application object. Main thread.
+// Adds the command "config" with "new", "check", "show" and "profiles" below it. Parsing fills
+// `options`, which must outlive the application object. Main thread.
 void AddConfig(CLI::App* app, ConfigOptions* options);
 
-// Prints a configuration made of flags, lets the driver judge one, or explains one key by key.
+// Prints a configuration made of flags, lets the driver judge one, explains one key by key, or
+// lists and checks the profiles.
 // Returns the exit status of the program.
 int RunConfig(const ConfigOptions& options);

@@ -8,6 +8,7 @@
 #include <utility>
 #include <vector>
 
+#include "host/commands/ProfileUse.h"
 #include "host/control/AttachedInstance.h"
 #include "host/control/ControlPath.h"
 #include "host/framing/ConfigEdit.h"
@@ -75,6 +76,9 @@ void AddPortAndStore(CLI::App* command, InstanceAccess* access) {
       ->type_name("PORT")
       ->expected(1)
       ->take_all()
+      ->group(kGroup);
+  command->add_option("--profile", access->profile, "Section of the profiles file to take")
+      ->type_name("NAME")
       ->group(kGroup);
   command
       ->add_option("-c,--config", access->configSource,
@@ -144,8 +148,11 @@ std::unique_ptr<Instance> AttachInstance(const InstanceAccess& access, Answer* a
 }
 
 void AddInstanceAccess(CLI::App* command, InstanceAccess* access, bool hasPortWord) {
+  access->command = command;
   if (hasPortWord) {
-    command->add_option("PORT", access->portWord, "Port to open: a path or comN=PATH[,OPTION...]")
+    command
+        ->add_option("PORT", access->portWord,
+                     "Port to open: a path or comN=PATH[,OPTION...]; or a profile")
         ->type_name("");
   }
   CLI::Option* const quiet =
@@ -164,10 +171,14 @@ void AddInstanceAccess(CLI::App* command, InstanceAccess* access, bool hasPortWo
 
 bool Resolve(InstanceAccess* access, Answer* answer) {
   InstanceOptions& options = access->options;
+  std::string error;
+  if (!UseProfile(access, &error)) {
+    *answer = Refusal(error, ExitStatus::kUsage);
+    return false;
+  }
   if (!access->portWord.empty()) {
     options.portWords.push_back(access->portWord);
   }
-  std::string error;
   if (!access->configSource.empty() &&
       !ReadConfiguration(access->configSource, &options.configuration, &error)) {
     *answer = Refusal(error, ExitStatus::kUsage);

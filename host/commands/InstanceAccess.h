@@ -20,11 +20,13 @@ class App;
 struct InstanceAccess {
   InstanceOptions options;
   FramingFlags framing;
-  std::string portWord;      // the positional PORT
-  std::string configSource;  // --config: a file, "-" or the text itself
-  std::string instanceName;  // --instance; empty: the only one, or that of the configured port
-  bool isQuiet = false;      // -q
-  int verbosity = 0;         // -v, counted
+  CLI::App* command = nullptr;  // the one that has the options
+  std::string portWord;         // the positional PORT
+  std::string profile;          // --profile
+  std::string configSource;     // --config: a file, "-" or the text itself
+  std::string instanceName;     // --instance; empty: the only one, or that of the configured port
+  bool isQuiet = false;         // -q
+  int verbosity = 0;            // -v, counted
   bool isAttachWanted = false;
   bool isAttachRefused = false;
   bool acknowledges = true;

@@ -80,7 +80,7 @@ void FramingFlags::AddReceiving(CLI::App* command) {
       ->type_name("MS")
       ->check(CLI::Range(0, std::numeric_limits<int>::max()).description(""));
   command->add_flag_function(
-      "--hex", [this](std::int64_t /*count*/) { given_["hex_tokens"] = "true"; },
+      "--hex", [this](std::int64_t count) { given_["hex_tokens"] = count > 0 ? "true" : "false"; },
       "Tokens as hexadecimal text; lets zero bytes through");
 }
 
@@ -142,6 +142,20 @@ void FramingFlags::AddBytes(CLI::App* command, const char* flags, const char* ke
           },
           help)
       ->type_name("BYTES");
+}
+
+bool FramingFlags::Preset(const std::string& key, const std::string& value, std::string* error) {
+  const ConfigKey* const entry = FindConfigKey(key);
+  const std::string allowed = entry == nullptr ? "" : entry->AllowedText();
+  const bool isAllowed = entry != nullptr && (entry->kind == ConfigKey::Kind::kBoolean
+                                                  ? value == "true" || value == "false"
+                                                  : value == allowed);
+  if (!isAllowed) {
+    *error = "\"" + EscapeBytes(value) + "\" is none of " + allowed;
+    return false;
+  }
+  given_.emplace(key, value);
+  return true;
 }
 
 std::string FramingFlags::Apply(const std::string& configuration) const {

@@ -34,6 +34,10 @@ class FramingFlags {
   // takes the name that the driver asks the host for, not a path.
   void AddConfiguring(CLI::App* command);
 
+  // Sets CfgVer, model or autoConnect, which have no option here, unless it was given. False with
+  // the reason in `error` for a value that the key does not have.
+  bool Preset(const std::string& key, const std::string& value, std::string* error);
+
   // True when at least one of the options was given.
   bool IsGiven() const { return !given_.empty(); }
 
