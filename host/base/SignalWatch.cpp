@@ -11,6 +11,7 @@
 #include <cerrno>
 #include <csignal>
 #include <cstdint>
+#include <cstdlib>
 #include <thread>
 #include <utility>
 
@@ -42,7 +43,8 @@ void SignalWatch::State::Run() {
     }
     const int signalNumber = static_cast<int>(info.ssi_signo);
     if (!isFirst) {
-      _exit(static_cast<int>(ExitStatus::kFirstSignal) + signalNumber);
+      // What must be put back whatever happens is registered with at_quick_exit.
+      std::quick_exit(static_cast<int>(ExitStatus::kFirstSignal) + signalNumber);
     }
     isFirst = false;
     onSignal(signalNumber);

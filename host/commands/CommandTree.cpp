@@ -25,6 +25,7 @@
 #include "host/commands/StoreCommand.h"
 #include "host/commands/SubCommand.h"
 #include "host/commands/TagsCommand.h"
+#include "host/commands/TermCommand.h"
 #include "host/commands/WriteCommand.h"
 #include "host/sim/SimRun.h"
 
@@ -107,6 +108,7 @@ CommandTree::CommandTree()
   Add(kEveryday, Make<SubOptions, AddSub, RunSub>());
   Add(kEveryday, Make<SendOptions, AddSend, RunSend>());
   Add(kEveryday, Make<AskOptions, AddAsk, RunAsk>());
+  Add(kEveryday, Make<TermOptions, AddTerm, RunTerm>());
   Add(kEveryday, std::make_unique<CmdCommand>());
   Add(kEveryday, Make<PortsOptions, AddPorts, RunPorts>());
   Add(kTagsAndSettings, Make<TagsOptions, AddTags, RunTags>());
