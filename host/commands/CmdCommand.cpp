@@ -112,7 +112,7 @@ int RunOn(Instance* instance, const std::string& line) {
 int RunWithPort(const InstanceAccess& access, const std::string& line) {
   if (access.options.portWords.empty() || access.options.configuration.empty()) {
     return UsageError("'" + PrintableUtf8(CommandWord(line)) +
-                      "' needs a running instance, or a port and --config; only help, info, xml, "
+                      "' needs a running instance, or a port; only help, info, xml, "
                       "lasterror, getmaxtm and deletetags do without");
   }
   Answer answer;

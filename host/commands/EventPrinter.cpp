@@ -23,6 +23,26 @@ std::string HintForDropReason(const std::string& name) {
   return "";
 }
 
+std::string RoleText(const BytesLabelled& labelled, const TextStyle& style) {
+  const std::string text = HexBytes(labelled.bytes) + " " + labelled.role;
+  return labelled.role == NameOf(ByteRole::kBody) ? text : style.Dim(text);
+}
+
+// Sent bytes cyan, dropped ones and findings red, what the host has to say bold.
+std::string Coloured(const HostEvent& event, const TextStyle& style) {
+  const std::string text = EventText(event);
+  if (std::holds_alternative<BytesSent>(event.detail)) {
+    return style.Cyan(text);
+  }
+  if (std::holds_alternative<BytesDropped>(event.detail) ||
+      std::holds_alternative<FindingMade>(event.detail)) {
+    return style.Red(text);
+  }
+  const bool isHostMessage = std::holds_alternative<PortChanged>(event.detail) ||
+                             std::holds_alternative<NoteMade>(event.detail);
+  return isHostMessage ? style.Bold(text) : text;
+}
+
 std::string Join(const std::vector<std::string>& lines) {
   std::string text;
   for (const std::string& line : lines) {
@@ -36,11 +56,15 @@ std::string Join(const std::vector<std::string>& lines) {
 void EventPrinter::OnEvent(const HostEvent& event) {
   const auto* const token = std::get_if<TokenReceived>(&event.detail);
   const auto* const received = std::get_if<BytesReceived>(&event.detail);
+  const auto* const labelled = std::get_if<BytesLabelled>(&event.detail);
   if (options_.form == PrintOptions::Form::kJson) {
     if (IsWanted(event)) {
       isOutputGone_ = !WriteResult(ToJsonLine(event) + "\n") || isOutputGone_;
     }
+  } else if (labelled != nullptr) {
+    roles_ += (roles_.empty() ? "" : "  ") + RoleText(*labelled, errorStyle_);
   } else if (token != nullptr && !options_.isRaw) {
+    TellRoles();
     PrintToken(event, *token);
   } else if (received != nullptr && options_.isRaw) {
     PrintRaw(event, *received);
@@ -56,6 +80,9 @@ bool EventPrinter::IsWanted(const HostEvent& event) const {
   }
   if (options_.isQuiet) {
     return false;
+  }
+  if (std::holds_alternative<BytesLabelled>(event.detail)) {
+    return options_.verbosity >= 2;
   }
   if (std::holds_alternative<BytesReceived>(event.detail)) {
     return options_.isRaw || options_.verbosity >= 2;
@@ -77,7 +104,9 @@ void EventPrinter::PrintToken(const HostEvent& event, const TokenReceived& token
       WriteLine(event, HexBytes(token.bytes));
       break;
     case PrintOptions::Form::kDump:
-      WriteLine(event, "rx " + HexDump(token.frame.empty() ? token.bytes : token.frame));
+      WriteLine(event, "rx " + (token.frame.empty() ? HexDump(token.bytes)
+                                                    : HexDump(token.frame, token.prefixBytes,
+                                                              token.suffixBytes, style_)));
       break;
     case PrintOptions::Form::kFormat:
       WriteLine(event, options_.format.Write(event));
@@ -105,9 +134,18 @@ void EventPrinter::PrintRaw(const HostEvent& event, const BytesReceived& receive
   }
 }
 
+// One line a frame: "02 prefix  41 42 body  03 suffix".
+void EventPrinter::TellRoles() {
+  if (!roles_.empty() && options_.verbosity >= 2 && !options_.isQuiet) {
+    TellUser(roles_);
+  }
+  roles_.clear();
+}
+
 // What a reason means is said once.
 void EventPrinter::TellEvent(const HostEvent& event) {
-  TellUser(EventText(event));
+  TellRoles();
+  TellUser(Coloured(event, errorStyle_));
   const auto* const drop = std::get_if<BytesDropped>(&event.detail);
   if (drop != nullptr && hintedReasons_.insert(drop->reason).second) {
     const std::string hint = HintForDropReason(drop->reason);

@@ -85,6 +85,10 @@ void AddPortAndStore(CLI::App* command, InstanceAccess* access) {
                    "Configuration: a file, - for standard input, or the text itself")
       ->type_name("CONFIG")
       ->group(kGroup);
+  command
+      ->add_flag("--no-reconnect", access->isFinalLoss,
+                 "The loss of the line ends it, exit status 6")
+      ->group(kGroup);
   CLI::Option* const store =
       command->add_option("--store", options.storeFile, "File with the stored settings")
           ->type_name("FILE")
@@ -107,11 +111,13 @@ void AddAttaching(CLI::App* command, InstanceAccess* access) {
   command->add_option("--instance", access->instanceName, "Which one to attach to, by its port")
       ->type_name("NAME")
       ->group(kGroup);
+  CLI::Option* const instance = command->get_option("--instance");
   CLI::Option* const attach =
       command->add_flag("--attach", access->isAttachWanted, "Only with a running instance")
           ->group(kGroup);
   command->add_flag("--no-attach", access->isAttachRefused, "Never with a running instance")
       ->excludes(attach)
+      ->excludes(instance)
       ->group(kGroup);
 }
 
@@ -135,7 +141,7 @@ std::unique_ptr<Instance> AttachInstance(const InstanceAccess& access, Answer* a
     return nullptr;
   }
   if (found.empty()) {
-    if (access.isAttachWanted) {
+    if (access.isAttachWanted || !access.instanceName.empty()) {
       *answer = Refusal(access.options.portWords.empty() ? "no instance is running"
                                                          : "no instance is running on this port",
                         ExitStatus::kPort);
@@ -145,6 +151,12 @@ std::unique_ptr<Instance> AttachInstance(const InstanceAccess& access, Answer* a
   }
   TellAttached(access, *found.front());
   return std::move(found.front());
+}
+
+void AddColour(CLI::App* command, std::string* colour) {
+  command->add_option("--color", *colour, "When to use colours")
+      ->type_name("auto|always|never")
+      ->check(CLI::IsMember({"auto", "always", "never"}).description(""));
 }
 
 void AddInstanceAccess(CLI::App* command, InstanceAccess* access, bool hasPortWord) {
@@ -159,6 +171,7 @@ void AddInstanceAccess(CLI::App* command, InstanceAccess* access, bool hasPortWo
       command->add_flag("-q,--quiet", access->isQuiet, "Nothing beside results and refusals");
   command->add_flag("-v,--verbose", access->verbosity, "More on standard error; -vv: every byte")
       ->excludes(quiet);
+  AddColour(command, &access->colour);
   AddPortAndStore(command, access);
   AddAttaching(command, access);
   const std::size_t before = command->get_options().size();
@@ -178,6 +191,11 @@ bool Resolve(InstanceAccess* access, Answer* answer) {
   }
   if (!access->portWord.empty()) {
     options.portWords.push_back(access->portWord);
+  }
+  if (access->isFinalLoss) {
+    for (std::string& word : options.portWords) {
+      word += ",reconnect=off";
+    }
   }
   if (!access->configSource.empty() &&
       !ReadConfiguration(access->configSource, &options.configuration, &error)) {

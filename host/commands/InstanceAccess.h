@@ -27,11 +27,16 @@ struct InstanceAccess {
   std::string instanceName;     // --instance; empty: the only one, or that of the configured port
   bool isQuiet = false;         // -q
   int verbosity = 0;            // -v, counted
+  std::string colour = "auto";  // --color, as TextStyle takes it
+  bool isFinalLoss = false;     // --no-reconnect
   bool isAttachWanted = false;
   bool isAttachRefused = false;
   bool acknowledges = true;
   bool connects = true;
 };
+
+// Adds --color.
+void AddColour(CLI::App* command, std::string* colour);
 
 // Adds PORT, --port, --config, the framing flags, --store, --attach and the like.
 void AddInstanceAccess(CLI::App* command, InstanceAccess* access, bool hasPortWord = true);

@@ -25,6 +25,11 @@ class DetailWriter {
     Set("sent", detail.takenBytes);
   }
 
+  void operator()(const BytesLabelled& detail) {
+    Set("role", detail.role);
+    Set("hex", CompactHex(detail.bytes));
+  }
+
   void operator()(const TokenReceived& detail) {
     Set("n", detail.number);
     Set("len", detail.lengthBytes);
@@ -39,6 +44,8 @@ class DetailWriter {
     }
     if (!detail.frame.empty()) {
       Set("frame", CompactHex(detail.frame));
+      Set("prefix_len", detail.prefixBytes);
+      Set("suffix_len", detail.suffixBytes);
     }
   }
 
@@ -93,6 +100,7 @@ class DetailWriter {
 struct KindName {
   const char* operator()(const BytesReceived& /*detail*/) const { return "rx"; }
   const char* operator()(const BytesSent& /*detail*/) const { return "tx"; }
+  const char* operator()(const BytesLabelled& /*detail*/) const { return "label"; }
   const char* operator()(const TokenReceived& /*detail*/) const { return "token"; }
   const char* operator()(const BytesDropped& /*detail*/) const { return "drop"; }
   const char* operator()(const PortChanged& /*detail*/) const { return "port"; }
@@ -134,7 +142,12 @@ HostEvent::Detail DetailOf(const std::string& kind, const nlohmann::json& json) 
                          json.at("waiting").get<unsigned>(),
                          json.value("dur_us", std::int64_t{-1}),
                          json.value("cut", false),
-                         json.contains("frame") ? BytesOf(json, "frame") : ""};
+                         json.contains("frame") ? BytesOf(json, "frame") : "",
+                         json.value("prefix_len", std::uint64_t{0}),
+                         json.value("suffix_len", std::uint64_t{0})};
+  }
+  if (kind == "label") {
+    return BytesLabelled{text("role"), BytesOf(json, "hex")};
   }
   if (kind == "drop") {
     return BytesDropped{text("why"), BytesOf(json, "hex"), json.value("after_ms", 0)};

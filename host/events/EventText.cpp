@@ -21,6 +21,10 @@ struct DetailText {
     return text;
   }
 
+  std::string operator()(const BytesLabelled& detail) const {
+    return HexBytes(detail.bytes) + " " + detail.role;
+  }
+
   std::string operator()(const TokenReceived& detail) const {
     return "token " + std::to_string(detail.number) + "  " + Quoted(detail.bytes) +
            (detail.isCut ? "..." : "") + "  " + std::to_string(detail.lengthBytes) + " bytes";

@@ -28,6 +28,14 @@ struct TokenReceived {
   std::int64_t durationUs = -1;  // from the frame's first to its last byte; -1 not known
   bool isCut = false;
   std::string frame;  // as it came on the line, prefix and suffix included; empty when not known
+  std::uint64_t prefixBytes = 0;  // of the frame
+  std::uint64_t suffixBytes = 0;
+};
+
+// Bytes of a token, and what they are in its frame.
+struct BytesLabelled {
+  std::string role;  // "prefix", "body", "suffix"
+  std::string bytes;
 };
 
 // Bytes that did not become part of a token.
@@ -72,8 +80,8 @@ struct FindingMade {
 };
 
 struct HostEvent {
-  using Detail = std::variant<BytesReceived, BytesSent, TokenReceived, BytesDropped, PortChanged,
-                              SettingChanged, ConsoleReplied, NoteMade, FindingMade>;
+  using Detail = std::variant<BytesReceived, BytesSent, BytesLabelled, TokenReceived, BytesDropped,
+                              PortChanged, SettingChanged, ConsoleReplied, NoteMade, FindingMade>;
 
   std::int64_t timeUs = 0;  // microseconds since 1970-01-01 UTC
   std::string port;         // the name in the configuration, "com1"

@@ -29,6 +29,7 @@ struct Statistics::Counter {
     counts->losses_ += detail.state == "lost" ? 1U : 0U;
     counts->reconnects_ += detail.state == "back" ? 1U : 0U;
   }
+  void operator()(const BytesLabelled& /*detail*/) const {}
   void operator()(const FindingMade& /*detail*/) const { ++counts->findings_; }
   void operator()(const SettingChanged& /*detail*/) const {}
   void operator()(const ConsoleReplied& /*detail*/) const {}

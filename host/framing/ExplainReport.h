@@ -8,7 +8,7 @@
 #include <vector>
 
 #include "host/framing/ByteLabeller.h"
-#include "host/framing/TextStyle.h"
+#include "host/text/TextStyle.h"
 
 // Writes what a labeller tells as lines for people or as NDJSON. One thread.
 class ExplainReport final : public LabelSink {

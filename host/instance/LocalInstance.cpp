@@ -13,10 +13,12 @@ namespace {
 
 constexpr int kLineWaitStepMs = 5;
 
-Answer AnswerOf(const HostResult& result) {
+Answer AnswerOf(const HostResult& result, bool hasStore) {
   Answer answer = Refusal(result.text, result.status);
   if (result.status == ExitStatus::kPort) {
     answer.hints = AdviceFor(result.problem);
+  } else if (result.status == ExitStatus::kRefused && hasStore) {
+    answer.hints.emplace_back("--no-store goes on without stored settings");
   }
   return answer;
 }
@@ -73,12 +75,13 @@ std::unique_ptr<LocalInstance> LocalInstance::Open(const Options& options, Answe
 }
 
 Answer LocalInstance::Start(const Options& options) {
+  const bool hasStore = !options.instance.withoutStore;
   HostResult result = session_.Open();
   if (result.IsDone()) {
     result = session_.Configure(options.instance.configuration);
   }
   if (result.status == ExitStatus::kConfiguration) {
-    Answer answer = AnswerOf(result);
+    Answer answer = AnswerOf(result, hasStore);
     answer.hints.push_back("the driver rejects the configuration: " +
                            EscapeBytes(options.instance.configuration));
     return answer;
@@ -87,7 +90,7 @@ Answer LocalInstance::Start(const Options& options) {
     result = session_.Start();
   }
   if (!result.IsDone()) {
-    return AnswerOf(result);
+    return AnswerOf(result, hasStore);
   }
   Requests::Info info;
   info.path = session_.PathOf(options.instance.PortName());

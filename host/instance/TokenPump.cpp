@@ -102,9 +102,12 @@ void TokenPump::OnLabelled(const LabelledBytes& labelled) {
   if (labelled.role == ByteRole::kDropped) {
     events_->Publish(BytesDropped{NameOf(labelled.reason), labelled.bytes, labelled.afterMs},
                      recordTimeUs_);
-  } else {
-    frame_ += labelled.bytes;
+    return;
   }
+  events_->Publish(BytesLabelled{NameOf(labelled.role), labelled.bytes}, recordTimeUs_);
+  frame_.bytes += labelled.bytes;
+  frame_.prefixBytes += labelled.role == ByteRole::kPrefix ? labelled.bytes.size() : 0;
+  frame_.suffixBytes += labelled.role == ByteRole::kSuffix ? labelled.bytes.size() : 0;
 }
 
 void TokenPump::OnCutToken(const CutToken& token) {
@@ -204,7 +207,9 @@ bool TokenPump::MustWaitForLine(const ReceivedToken& token) {
 void TokenPump::AddWhatTheLineKnows(const ReceivedToken& token, TokenReceived* detail) {
   const auto found = FindOnLine(token);
   if (found != lineTokens_.end()) {
-    detail->frame = found->frame;
+    detail->frame = found->frame.bytes;
+    detail->prefixBytes = found->frame.prefixBytes;
+    detail->suffixBytes = found->frame.suffixBytes;
     detail->durationUs = found->durationUs;
     lineTokens_.erase(lineTokens_.begin(), found + 1);
   }

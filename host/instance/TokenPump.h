@@ -52,9 +52,14 @@ class TokenPump final : public CheckSink {
 
  private:
   // A token as the host read it from the line.
+  struct Frame {
+    std::string bytes;
+    std::size_t prefixBytes = 0;
+    std::size_t suffixBytes = 0;
+  };
   struct LineToken {
     std::string bytes;
-    std::string frame;
+    Frame frame;
     std::int64_t durationUs = 0;
   };
 
@@ -86,7 +91,7 @@ class TokenPump final : public CheckSink {
   std::int64_t recordLastNs_ = 0;
   std::uint64_t servedBytes_ = 0;
   std::optional<std::int64_t> frameFirstNs_;
-  std::string frame_;
+  Frame frame_;  // what was told of the next token
   std::optional<Deadline> lineWait_;
   std::deque<LineToken> lineTokens_;  // cut from the line, not yet met in the driver's queue
 };

@@ -52,8 +52,8 @@ TEST(Program, WrongUsageIsStatus2) {
       {"bogus"},
       {"--bogus"},
       {"sub"},
-      {"sub", "--port", "/dev/x"},
-      {"sub", "--config", "CfgVer=1"},
+      {"sub", "--instance", "com1", "--no-attach"},
+      {"sub", "-v", "-q", "--port", "/dev/x"},
       {"sub", "--port", "com17=/dev/x", "--config", "CfgVer=1"},
       {"sub", "--port", "/dev/x", "--port", "/dev/y", "--config", "CfgVer=1"},
       {"sub", "--port", "/dev/x", "--config", "CfgVer=1", "--store", "f", "--no-store"}};
@@ -121,7 +121,7 @@ TEST(Program, SubHintsAtZeroBytes) {
   ASSERT_TRUE(sub.AwaitErrors("queue 100")) << sub.Errors();
   ASSERT_TRUE(line.Send(std::string("ab\0c\x03", 5), Deadline::After(kLimitMs)));
   EXPECT_TRUE(Holds(sub.Line(), R"(  4  "ab"  61 62)"));
-  EXPECT_TRUE(sub.AwaitErrors("HINT")) << sub.Errors();
+  EXPECT_TRUE(sub.AwaitErrors("4 bytes and a zero byte behind the first 2")) << sub.Errors();
   sub.Signal(SIGINT);
   EXPECT_EQ(sub.Status(), 128 + SIGINT);
 }

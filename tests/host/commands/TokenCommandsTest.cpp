@@ -57,6 +57,40 @@ TEST(SubCommand, ShowsFramesHexAndFormats) {
   }
 }
 
+TEST(SubCommand, SaysTheRoleOfEachByte) {
+  PseudoTerminal line;
+  ASSERT_TRUE(
+      line.Send("x\x02"
+                "AB\x03",
+                Limit()));
+  ProgramRun run(With({"sub", "-C", "1", "-vv"}, line.Path(), "rx_prefix=02 rx_suffix=03"));
+  EXPECT_EQ(run.Output(), "AB\n");
+  EXPECT_TRUE(Holds(run.Errors(), "loka: drop no-prefix: 78")) << run.Errors();
+  EXPECT_TRUE(Holds(run.Errors(), "loka: 02 prefix  41 42 body  03 suffix\n")) << run.Errors();
+}
+
+TEST(SubCommand, ColoursWhereTheyAreAskedFor) {
+  PseudoTerminal line;
+  ASSERT_TRUE(
+      line.Send("x\x02"
+                "A\x03",
+                Limit()));
+  ProgramRun run(With({"sub", "-C", "1", "-X", "--color", "always"}, line.Path(),
+                      "rx_prefix=02 rx_suffix=03"));
+  EXPECT_EQ(run.Output(),
+            "rx \x1b[2m02\x1b[0m 41 \x1b[2m03\x1b[0m   \x1b[2m.\x1b[0mA\x1b[2m.\x1b[0m\n");
+  EXPECT_TRUE(Holds(run.Errors(), "loka: \x1b[31mdrop ")) << run.Errors();
+}
+
+TEST(SubCommand, WithoutReconnectTheLossOfTheLineIsStatus6) {
+  auto line = std::make_unique<PseudoTerminal>();
+  ProgramRun run({"sub", line->Path(), "--no-reconnect", "--no-attach", "--no-store"});
+  ASSERT_TRUE(run.AwaitErrors("queue 100")) << run.Errors();
+  line.reset();
+  EXPECT_EQ(run.Status(), 6) << run.Errors();
+  EXPECT_TRUE(Holds(run.Errors(), ": line lost (")) << run.Errors();
+}
+
 TEST(SubCommand, SaysWhatWasDroppedAndWhatHelps) {
   PseudoTerminal line;
   ASSERT_TRUE(line.Send("ST,", Limit()));

@@ -8,6 +8,7 @@
 #include "host/events/HexDump.h"
 #include "host/events/Statistics.h"
 #include "host/events/TokenFormat.h"
+#include "host/text/TextStyle.h"
 
 namespace {
 
@@ -21,6 +22,7 @@ TEST(EventTextTest, SaysEachKind) {
             "rx 02 41  \"\\x02A\"");
   EXPECT_EQ(Text(BytesSent{"AB", 2}), "tx 41 42  \"AB\"");
   EXPECT_EQ(Text(BytesSent{"AB", 0}), "tx 41 42  \"AB\"  lost: the line took 0 of 2 bytes");
+  EXPECT_EQ(Text(BytesLabelled{"body", "AB"}), "41 42 body");
   EXPECT_EQ(Text(BytesDropped{"no-suffix", "ST,", 500}),
             "drop no-suffix after 500 ms: 53 54 2C  \"ST,\"");
   EXPECT_EQ(Text(SettingChanged{"staged", "baud", "19200", "9600"}),
@@ -46,6 +48,19 @@ TEST(EventTextTest, NeverHoldsABareControlByte) {
       }
     }
   }
+}
+
+TEST(HexDumpTest, PrefixAndSuffixAreDim) {
+  const std::string frame =
+      "\x02"
+      "AB\r\n";
+  EXPECT_EQ(HexDump(frame, 1, 2, TextStyle("never")), "02 41 42 0D 0A   .AB..");
+  EXPECT_EQ(HexDump(frame, 1, 2, TextStyle("always")),
+            "\x1b[2m02\x1b[0m 41 42 \x1b[2m0D 0A\x1b[0m   \x1b[2m.\x1b[0mAB\x1b[2m..\x1b[0m");
+  EXPECT_EQ(HexDump("A", 0, 0, TextStyle("always")), "41   A");
+  // More than there is: nothing is read behind the end.
+  EXPECT_EQ(HexDump("A", 5, 5, TextStyle("never")), "41   A");
+  EXPECT_EQ(HexDump("", 0, 0, TextStyle("never")), "   ");
 }
 
 TEST(TokenFormatTest, PutsTheTokenIn) {

@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
-#include "host/framing/TextStyle.h"
+#include "host/text/TextStyle.h"
 
 #include <unistd.h>
 
@@ -15,9 +15,9 @@ bool IsColourUnwanted() {
 
 }  // namespace
 
-TextStyle::TextStyle(std::string_view choice)
+TextStyle::TextStyle(std::string_view choice, int fileDescriptor)
     : isOn_(choice == "always" ||
-            (choice != "never" && !IsColourUnwanted() && isatty(STDOUT_FILENO) != 0)) {}
+            (choice != "never" && !IsColourUnwanted() && isatty(fileDescriptor) != 0)) {}
 
 std::string TextStyle::Wrap(const char* code, const std::string& text) const {
   return isOn_ ? std::string("\x1B[") + code + "m" + text + "\x1B[0m" : text;
