@@ -82,7 +82,7 @@ bool Protocol_LOKA::CommandConnect(const ConsoleCommand& command) {
     return command.Answer(ConsoleTexts_LOKA::kOk, true);
   }
   if (command.Argument() == ConsoleTexts_LOKA::kOn) {
-    const SemaphoreLock lock(portSemaphore_);
+    const SemaphoreLock lock(portSemaphore_, LockRank::kPortSemaphore);
     const bool isOpen = link_.Open(portName_, settings_.Serial());
     return command.Answer(isOpen ? ConsoleTexts_LOKA::kOk : Texts_LOKA::kCannotOpenPort, true);
   }

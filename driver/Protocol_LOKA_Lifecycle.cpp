@@ -90,12 +90,12 @@ bool Protocol_LOKA::OpenPort() {
 }
 
 bool Protocol_LOKA::OpenPortUnderSemaphore() {
-  const SemaphoreLock lock(portSemaphore_);
+  const SemaphoreLock lock(portSemaphore_, LockRank::kPortSemaphore);
   return OpenPort();
 }
 
 void Protocol_LOKA::ClosePortUnderSemaphore() {
-  const SemaphoreLock lock(portSemaphore_);
+  const SemaphoreLock lock(portSemaphore_, LockRank::kPortSemaphore);
   if (portSemaphore_ != nullptr) {
     link_.Close();
   } else {
@@ -104,6 +104,7 @@ void Protocol_LOKA::ClosePortUnderSemaphore() {
 }
 
 int Protocol_LOKA::Start() {
+  const LockOrderScope order(LockRank::kLife);
   const std::lock_guard<std::mutex> lock(lifeMutex_);
   if (started_) {
     return 1;
@@ -124,6 +125,7 @@ int Protocol_LOKA::Start() {
 }
 
 int Protocol_LOKA::Stop() {
+  const LockOrderScope order(LockRank::kLife);
   const std::lock_guard<std::mutex> lock(lifeMutex_);
   if (started_) {
     taskRunner_.Stop();

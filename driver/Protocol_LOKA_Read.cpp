@@ -55,7 +55,7 @@ bool Protocol_LOKA::doReadBlock(const Tag_LOKA& tag, ReadTarget target) {
   if (tag.IsSerialParam()) {
     return ReadSerialParam(tag, target);
   }
-  const SemaphoreLock lock(queueSemaphore_);
+  const SemaphoreLock lock(queueSemaphore_, LockRank::kQueueSemaphore);
   return ReadTokenType(tag, target);
 }
 

@@ -58,12 +58,12 @@ void Protocol_LOKA::ReceivePass() {
 }
 
 SerialLink::ReceiveResult Protocol_LOKA::ReceiveByte(unsigned char& byte, int timeoutMs) {
-  const SemaphoreLock lock(portSemaphore_);
+  const SemaphoreLock lock(portSemaphore_, LockRank::kPortSemaphore);
   return link_.Receive(byte, timeoutMs);
 }
 
 void Protocol_LOKA::QueueToken(std::string_view token) {
-  const SemaphoreLock lock(queueSemaphore_);
+  const SemaphoreLock lock(queueSemaphore_, LockRank::kQueueSemaphore);
   addToken(token);
 }
 

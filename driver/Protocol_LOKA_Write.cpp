@@ -107,7 +107,7 @@ bool Protocol_LOKA::doWrite(const Tag_LOKA& tag, const unsigned char* data) {
   if (tag.IsSerialParam()) {
     return WriteSerialParam(tag, data);
   }
-  const SemaphoreLock lock(queueSemaphore_);
+  const SemaphoreLock lock(queueSemaphore_, LockRank::kQueueSemaphore);
   return WriteTokenType(tag, data);
 }
 
@@ -173,7 +173,7 @@ bool Protocol_LOKA::StageFramingText(const char* name, const char* text, const c
 // Makes the staged settings the active ones, stores them and runs with them. The port is set up
 // again only when one of its five settings has changed; the tokens that wait are dropped.
 bool Protocol_LOKA::ApplyStagedSettings() {
-  const SemaphoreLock lock(queueSemaphore_);
+  const SemaphoreLock lock(queueSemaphore_, LockRank::kQueueSemaphore);
   // A snapshot: what another thread stages meanwhile waits for the next time.
   const GroupParameterReplacer staged(staged_);
   staged.activate(active_, kNoNode, true);

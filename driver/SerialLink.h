@@ -83,7 +83,7 @@ class SerialLink {
   // Held while the port is used from outside the receive task, a send or a set-up in progress
   // included: the one leaf lock that is held across a host call that can block. Nothing is locked
   // inside it but passMutex_'s short sections.
-  LeafMutex useMutex_;
+  LeafMutex useMutex_{LockRank::kPortUse};
   std::atomic<ISerialPort*> port_{nullptr};  // written under useMutex_, read by the receive task
 
   LeafMutex passMutex_;

@@ -3,6 +3,7 @@
 
 #include <mutex>
 
+#include "protlib/LockOrder.h"
 #include "protlib/ThreadAnnotations.h"
 
 // A lock inside the driver that the host never sees. It is a leaf: whoever holds it takes no other
@@ -10,11 +11,25 @@
 // keeps a port alive while it sends; it says so there.
 class LOKA_CAPABILITY("mutex") LeafMutex {
  public:
-  void Lock() LOKA_ACQUIRE() { mutex_.lock(); }
-  void Unlock() LOKA_RELEASE() { mutex_.unlock(); }
+  explicit LeafMutex(LockRank rank = LockRank::kLeaf) : rank_(rank) {}
+
+  void Lock() LOKA_ACQUIRE() {
+    if constexpr (kChecksLockOrder) {
+      LockOrder::Check(rank_);
+      LockOrder::Taken(rank_);
+    }
+    mutex_.lock();
+  }
+  void Unlock() LOKA_RELEASE() {
+    mutex_.unlock();
+    if constexpr (kChecksLockOrder) {
+      LockOrder::Freed(rank_);
+    }
+  }
 
  private:
   std::mutex mutex_;
+  const LockRank rank_;
 };
 
 // Holds a LeafMutex for a scope.

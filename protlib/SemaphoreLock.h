@@ -2,17 +2,28 @@
 #pragma once
 
 #include "interfaces/ISemaphore.h"
+#include "protlib/LockOrder.h"
 
 // Holds a host semaphore for a scope. A host that could not create the semaphore left a null: the
 // scope then runs without it, and the driver's own leaf locks still keep the data whole.
 class SemaphoreLock {
  public:
-  explicit SemaphoreLock(ISemaphore* semaphore) : semaphore_(semaphore) {
+  // `rank` says which of the two semaphores it is, also when it is a null.
+  SemaphoreLock(ISemaphore* semaphore, LockRank rank) : semaphore_(semaphore), rank_(rank) {
+    if constexpr (kChecksLockOrder) {
+      LockOrder::Check(rank_);
+    }
     if (semaphore_ != nullptr) {
       semaphore_->Lock();
     }
+    if constexpr (kChecksLockOrder) {
+      LockOrder::Taken(rank_);
+    }
   }
   ~SemaphoreLock() {
+    if constexpr (kChecksLockOrder) {
+      LockOrder::Freed(rank_);
+    }
     if (semaphore_ != nullptr) {
       semaphore_->Unlock();
     }
@@ -22,4 +33,5 @@ class SemaphoreLock {
 
  private:
   ISemaphore* semaphore_;
+  const LockRank rank_;
 };

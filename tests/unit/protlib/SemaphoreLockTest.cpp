@@ -10,7 +10,7 @@ TEST(SemaphoreLockTest, HoldsTheSemaphoreForTheScope) {
   CallLog log;
   ScriptedSemaphore semaphore(log, "queue", ScriptedSemaphore::Kind::kQueue);
   {
-    const SemaphoreLock lock(&semaphore);
+    const SemaphoreLock lock(&semaphore, LockRank::kQueueSemaphore);
     EXPECT_TRUE(semaphore.IsHeld());
   }
   EXPECT_FALSE(semaphore.IsHeld());
@@ -22,11 +22,13 @@ TEST(SemaphoreLockTest, FreesTheSemaphoreWhenTheScopeIsLeftByAnException) {
   ScriptedSemaphore semaphore(log, "queue", ScriptedSemaphore::Kind::kQueue);
   EXPECT_THROW(
       {
-        const SemaphoreLock lock(&semaphore);
+        const SemaphoreLock lock(&semaphore, LockRank::kQueueSemaphore);
         throw std::runtime_error("on the way");
       },
       std::runtime_error);
   EXPECT_FALSE(semaphore.IsHeld());
 }
 
-TEST(SemaphoreLockTest, RunsWithoutASemaphore) { const SemaphoreLock lock(nullptr); }
+TEST(SemaphoreLockTest, RunsWithoutASemaphore) {
+  const SemaphoreLock lock(nullptr, LockRank::kPortSemaphore);
+}
