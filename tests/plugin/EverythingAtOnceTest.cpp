@@ -1,8 +1,9 @@
 // SPDX-License-Identifier: Apache-2.0
-// The receive task, reads and writes of every tag, the applying of settings and every console
-// command at the same time, for as many seconds as LOKA_STRESS_SECONDS says (1 otherwise). Meant
-// for the thread sanitizer; the scripted host complains of a wrong order of semaphores, of a use of
-// a released port and of whatever is not given back.
+// The receive tasks of two protocols, reads and writes of every tag, the applying of settings,
+// every console command, starts and stops at the same time, for as many seconds as
+// LOKA_STRESS_SECONDS says (1 otherwise). Meant for the thread sanitizer; the scripted host
+// complains of a wrong order of semaphores, of a use of a released port and of whatever is not
+// given back.
 #include <atomic>
 #include <chrono>
 #include <cstdlib>
@@ -48,7 +49,7 @@ class EverythingAtOnceTest : public ConsoleFixture {
     return texts[round % Size];
   }
 
-  void ReadAnyTag(unsigned round) {
+  void ReadAnyTag(ProtocolUnderTest& protocol, unsigned round) {
     static const char* const kUris[] = {
         "0?rx_token?string-300",   "0?rx_token_len?unsignedInt", "0?tokens_available?unsignedInt",
         "0?token_ack?boolean",     "0?tx_token?string-9",        "0?connect?boolean",
@@ -58,13 +59,14 @@ class EverythingAtOnceTest : public ConsoleFixture {
         "0?SP_TxSuffix?string-20", "0?SP_HexTokens?boolean",     "0?SP_TokenQueueSize?unsignedInt",
         "0?SP_Done?boolean"};
     const std::shared_lock<std::shared_mutex> tagsInUse(tagsInUse_);
-    ITag* tag = P().Tag(Pick(kUris, round));
+    ITag* tag = protocol.Tag(Pick(kUris, round));
     ASSERT_NE(tag, nullptr);
-    EXPECT_NE(P().Read(tag).result, 0) << tag->GetVarName() << ": " << P().Error();
-    P()->FreeTag(tag);
+    const bool isRead = protocol.Read(tag).result != 0;
+    EXPECT_TRUE(isRead || stops_) << tag->GetVarName() << ": " << protocol.Error();
+    protocol->FreeTag(tag);
   }
 
-  void WriteAnyTag(unsigned round) {
+  void WriteAnyTag(ProtocolUnderTest& protocol, unsigned round) {
     static const struct {
       const char* uri;
       const char* value;
@@ -89,17 +91,17 @@ class EverythingAtOnceTest : public ConsoleFixture {
                    {"0?no_such_type?boolean", ""}};
     const auto& write = kWrites[round % std::size(kWrites)];
     const std::shared_lock<std::shared_mutex> tagsInUse(tagsInUse_);
-    ITag* tag = P().Tag(write.uri);
+    ITag* tag = protocol.Tag(write.uri);
     if (tag == nullptr) return;
     GuardedBuffer value(8);
     std::fill(value.Data(), value.Data() + 8, static_cast<unsigned char>(0));
     std::copy(write.value, write.value + std::char_traits<char>::length(write.value),
               value.Chars());
-    P()->Write(tag, value.Data());  // may be refused: the port opens and closes meanwhile
-    P()->FreeTag(tag);
+    protocol->Write(tag, value.Data());  // may be refused: the port opens and closes meanwhile
+    protocol->FreeTag(tag);
   }
 
-  void AnyConsoleCommand(unsigned round) {
+  void AnyConsoleCommand(ProtocolUnderTest& protocol, unsigned round) {
     static const char* const kCommands[] = {"help",
                                             "info",
                                             "xml",
@@ -134,27 +136,102 @@ class EverythingAtOnceTest : public ConsoleFixture {
     if (command == "deletetags") {
       // Nobody may use a tag that this destroys.
       const std::unique_lock<std::shared_mutex> noTagInUse(tagsInUse_);
-      EXPECT_TRUE(Command(command).result);
+      GuardedBuffer reply(8);
+      EXPECT_TRUE(protocol->DoCommand(command.c_str(), reply.Chars(), 8));
       return;
     }
-    Command(command);
+    GuardedBuffer reply(2000);
+    protocol->DoCommand(command.c_str(), reply.Chars(), 2000);
+    EXPECT_TRUE(reply.AreGuardsIntact()) << command;
+  }
+
+  void FeedLine(const char* port) {
+    host_.Line(port).Feed(
+        "\x02"
+        "4142\x03\x02\x02xyz\x03\r\n");
+    std::this_thread::sleep_for(std::chrono::microseconds(50));
   }
 
   std::shared_mutex tagsInUse_;
+  bool stops_ = false;  // the protocols are stopped on the way, so reads may be refused
 };
 
 TEST_F(EverythingAtOnceTest, NothingBreaks) {
   Run("token_queue_size=20 gap=5");
-  Repeat({[this](unsigned) {
-            host_.Line().Feed(
-                "\x02"
-                "4142\x03\x02\x02xyz\x03\r\n");
-            std::this_thread::sleep_for(std::chrono::microseconds(50));
-          },
-          [this](unsigned round) { ReadAnyTag(round); },
-          [this](unsigned round) { WriteAnyTag(round); },
-          [this](unsigned round) { AnyConsoleCommand(round); },
+  Repeat({[this](unsigned) { FeedLine("com1"); },
+          [this](unsigned round) { ReadAnyTag(P(), round); },
+          [this](unsigned round) { WriteAnyTag(P(), round); },
+          [this](unsigned round) { AnyConsoleCommand(P(), round); },
           [this](unsigned) { EXPECT_NE(P().ComParams().find("com1,"), std::string::npos); }});
+}
+
+TEST_F(EverythingAtOnceTest, TwoProtocolsThatAreStartedAndStopped) {
+  stops_ = true;
+  Run("token_queue_size=20 gap=5");
+  ProtocolUnderTest other(plugin_);
+  other->SetIdent("other");
+  ASSERT_TRUE(other.Config(
+      "CfgVer=1 model=1 port=com2 baudrate=300 parity=none bits=7 stopbits=2 mode=RS-485 "
+      "rx_suffix=03 token_queue_size=20 gap=5"));
+  ASSERT_NE(other->Start(), 0);
+  const auto start = [](ProtocolUnderTest& protocol, unsigned round) {
+    EXPECT_NE(protocol->Stop(), 0);
+    if (round % 3 == 0) std::this_thread::yield();
+    protocol->Start();  // may find the port already taken away again
+  };
+  Repeat({[this](unsigned) {
+            FeedLine("com1");
+            FeedLine("com2");
+          },
+          [this](unsigned round) { ReadAnyTag(P(), round); },
+          [&](unsigned round) { WriteAnyTag(round % 2 == 0 ? P() : other, round / 2); },
+          [&](unsigned round) { ReadAnyTag(other, round); },
+          [&](unsigned round) { AnyConsoleCommand(round % 2 == 0 ? P() : other, round / 2); },
+          [&](unsigned round) { start(round % 2 == 0 ? P() : other, round); }});
+  other->Stop();
+}
+
+// Protocols that come and go, most of them started, while others work.
+TEST_F(EverythingAtOnceTest, StartedProtocolsAreDeleted) {
+  Run("gap=5");
+  Repeat({[this](unsigned) { FeedLine("com1"); },
+          [this](unsigned round) { ReadAnyTag(P(), round); },
+          [this](unsigned round) {
+            ProtocolUnderTest passing(plugin_);
+            EXPECT_TRUE(passing.Config(Mandatory("rx_suffix=03 gap=5")));
+            const bool isStarted = round % 4 == 0 || passing->Start() != 0;
+            EXPECT_TRUE(isStarted);
+            passing.Tag("0?rx_token?string-9");
+            passing.Tag("0?SP_Gap?unsignedInt");
+          }});
+}
+
+// The host lets the module go while a protocol is still there: nothing works as it should any more,
+// and nothing breaks.
+TEST_F(ProtocolFixture, AHostThatClosesTheModuleEarly) {
+  Run("rx_suffix=03");
+  host_.Line().Feed("A\x03");
+  host_.RunUntilSilent();
+  plugin_.Close();
+  host_.Line().Feed("B\x03");
+  host_.RunUntilSilent();
+  EXPECT_EQ(P().TakeTokens(), "[A][B]");
+  EXPECT_TRUE(P().WriteText("tx_token", "x"));
+  EXPECT_TRUE(P().WriteNumber("SP_Baud", 300));
+  EXPECT_TRUE(P().WriteFlag("SP_Done", 1));
+  EXPECT_EQ(host_.Storage().Dump(), "") << "stored into a storage that was given back";
+  EXPECT_TRUE(P().WriteFlag("connect", 0));
+  EXPECT_TRUE(P().WriteFlag("connect", 1));
+  GuardedBuffer info(200);
+  EXPECT_GT(P()->GetInfo(info.Chars(), 200), 0);
+  EXPECT_NE(P()->Stop(), 0);
+  EXPECT_NE(P()->Start(), 0);
+  // A protocol that is made now has no services at all.
+  ProtocolUnderTest late(plugin_);
+  EXPECT_TRUE(late.Config(Mandatory("rx_suffix=03")));
+  EXPECT_EQ(late->Start(), 0);
+  EXPECT_EQ(late.Error(), "-1 Can't open serial port");
+  EXPECT_NE(late->Stop(), 0);
 }
 
 }  // namespace
