@@ -4,6 +4,8 @@ set(CMAKE_SYSTEM_NAME Linux)
 set(CMAKE_SYSTEM_PROCESSOR arm)
 set(CMAKE_C_COMPILER ${LOKA_PANEL_TRIPLET}-gcc)
 set(CMAKE_CXX_COMPILER ${LOKA_PANEL_TRIPLET}-g++)
+# No notes about a calling convention that changed before version 7 of the compiler.
+set(CMAKE_CXX_FLAGS_INIT -Wno-psabi)
 set(CMAKE_LIBRARY_ARCHITECTURE ${LOKA_PANEL_TRIPLET})
 
 # Libraries for the target that tests and the reference host use; scripts/panel.sh fills the folder.

@@ -81,3 +81,7 @@ target_googletest() {
   cmake --build "$work" >/dev/null
   DESTDIR=$target cmake --install "$work" >/dev/null
 }
+
+# What the reference host is built with, for the target.
+panel_host_packages=(zlib1g zlib1g-dev libsqlite3-0 libsqlite3-dev libpugixml1v5 libpugixml-dev
+  libcli11-dev nlohmann-json3-dev)

@@ -1,0 +1,80 @@
+# SPDX-License-Identifier: Apache-2.0
+# Kernel and file system of the emulated panel. Sourced by scripts/panel/test.sh.
+
+panel_image=$project_dir/build/panel-image
+panel_root=$panel_image/root
+
+# The newest kernel that Debian's own kernel package for the processor asks for.
+kernel_package() {
+  packages_for armhf linux-image-armmp >&2
+  dpkg-deb -f "$project_dir/build/panel-packages/armhf/linux-image-armmp"_*.deb Depends |
+    grep -o 'linux-image-[^ ,]*armmp' | head -1
+}
+
+# install_kernel: vmlinuz, and the modules of the disk (the UART's driver is built in).
+install_kernel() {
+  local package release module file modules=(kernel/drivers/virtio/virtio_pci.ko
+    kernel/drivers/block/virtio_blk.ko kernel/crypto/crc32c_generic.ko kernel/fs/ext4/ext4.ko)
+  package=$(kernel_package)
+  release=${package#linux-image-}
+  if [ ! -f "$panel_image/kernel/boot/vmlinuz-$release" ]; then
+    packages_for armhf "$package"
+    say "Unpacking the kernel $release"
+    unpack_packages armhf "$panel_image/kernel" "$package"
+    /sbin/depmod -b "$panel_image/kernel" "$release"
+  fi
+  cp "$panel_image/kernel/boot/vmlinuz-$release" "$panel_image/vmlinuz"
+  mkdir -p "$panel_root/modules"
+  : >"$panel_root/modules/order"
+  for module in "${modules[@]}"; do
+    # A module's line names what it needs, the innermost last.
+    for file in $(sed -n "s|^$module:||p" "$panel_image/kernel/lib/modules/$release/modules.dep" |
+      tr ' ' '\n' | tac) "$module"; do
+      cp "$panel_image/kernel/lib/modules/$release/$file" "$panel_root/modules/"
+      echo "${file##*/}" >>"$panel_root/modules/order"
+    done
+  done
+}
+
+# install_program FILE: into /opt, with the shared libraries that it needs.
+install_program() {
+  local triplet
+  triplet=$(panel_triplet armhf)
+  mkdir -p "$panel_root/opt"
+  "$triplet-strip" -o "$panel_root/opt/${1##*/}" "$1"
+  install_libraries_of "$1"
+}
+
+install_libraries_of() {
+  local triplet library folder
+  triplet=$(panel_triplet armhf)
+  mkdir -p "$panel_root/lib"
+  for library in $("$triplet-readelf" -d "$1" | sed -n 's/.*(NEEDED).*\[\(.*\)\].*/\1/p') \
+    ld-linux-armhf.so.3; do
+    [ ! -e "$panel_root/lib/$library" ] || continue
+    for folder in "/usr/$triplet/lib" "$(panel_build_dir armhf)/target/usr/lib/$triplet" \
+      "$(panel_build_dir armhf)/target/lib/$triplet"; do
+      [ -e "$folder/$library" ] || continue
+      cp -L "$folder/$library" "$panel_root/lib/$library"
+      install_libraries_of "$folder/$library"
+      break
+    done
+    [ -e "$panel_root/lib/$library" ] || die "no $library for the panel"
+  done
+}
+
+# make_image PROGRAM...: everything, packed.
+make_image() {
+  local program
+  say "Making the panel's image"
+  rm -rf "$panel_root"
+  mkdir -p "$panel_root"/{bin,dev,proc,sys,tmp,run,data}
+  packages_for armhf busybox-static
+  unpack_packages armhf "$panel_image/busybox" busybox-static
+  cp "$panel_image/busybox/bin/busybox" "$panel_root/bin/"
+  ln -s busybox "$panel_root/bin/sh"
+  cp "$project_dir/scripts/panel/init" "$panel_root/init"
+  install_kernel
+  for program in "$@"; do install_program "$program"; done
+  (cd "$panel_root" && find . | cpio -o -H newc --quiet | gzip -1) >"$panel_image/initramfs.gz"
+}
