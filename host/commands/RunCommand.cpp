@@ -9,8 +9,10 @@
 #include "host/events/EventSink.h"
 #include "host/events/EventText.h"
 #include "host/events/JsonLine.h"
+#include "host/events/SinkPair.h"
 #include "host/events/WallClock.h"
 #include "host/instance/LocalInstance.h"
+#include "host/log/LogFile.h"
 #include "host/text/Output.h"
 
 namespace {
@@ -46,6 +48,7 @@ void AddRun(CLI::App* app, RunOptions* options) {
       ->check(CLI::IsMember({"auto", "never"}).description(""))
       ->type_name("auto|never")
       ->capture_default_str();
+  run->add_option("-L,--log", options->logFile, "Append every event to a file")->type_name("FILE");
   AddInstanceAccess(run, &options->access);
   run->footer("Example: loka run --config scale.cfg /dev/ttyUSB0 --ack never");
 }
@@ -56,11 +59,16 @@ int RunRun(RunOptions* options) {
   if (!Resolve(&options->access, &answer)) {
     return TellAnswer(answer);
   }
+  std::string error;
+  const auto log = OpenLog(options->logFile, &error);
+  if (!error.empty()) {
+    TellUser(error);
+    return static_cast<int>(ExitStatus::kRefused);
+  }
   const auto instance = BeginInstance(options->access, &answer);
   if (instance == nullptr) {
     return TellAnswer(answer);
   }
-  std::string error;
   if (!instance->Share(&error)) {
     TellUser(error);
     return static_cast<int>(ExitStatus::kPort);
@@ -70,8 +78,9 @@ int RunRun(RunOptions* options) {
                                            : "left to those who attach (--ack never)"));
   TellUser("ready; commands attach at " + ControlPath(instance->Port()));
   LogPrinter printer(options->access.verbosity);
+  SinkPair sinks(&printer, log.get());
   answer = instance->Serve(
-      &printer, [] { return false; }, Deadline::After(kForeverMs));
+      &sinks, [] { return false; }, Deadline::After(kForeverMs));
   return EndOf(*instance, answer);
 }
 

@@ -13,6 +13,7 @@ class App;
 struct RunOptions {
   InstanceAccess access;
   std::string acknowledge = "auto";  // --ack auto|never
+  std::string logFile;               // --log; empty: none
 };
 
 void AddRun(CLI::App* app, RunOptions* options);

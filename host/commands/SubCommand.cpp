@@ -5,6 +5,8 @@
 #include <limits>
 
 #include "host/commands/EventPrinter.h"
+#include "host/events/SinkPair.h"
+#include "host/log/LogFile.h"
 #include "host/text/Output.h"
 
 namespace {
@@ -56,6 +58,7 @@ void AddSub(CLI::App* app, SubOptions* options) {
   sub->add_flag("-t,--time", options->hasTime, "Time of day in front of each line")->excludes(json);
   sub->add_flag("--raw", options->isRaw, "Bytes as they come instead of tokens")->excludes(format);
   sub->add_flag("--peek", options->isPeek, "Leave tokens in the queue: print the oldest only");
+  sub->add_option("-L,--log", options->logFile, "Append every event to a file")->type_name("FILE");
   AddInstanceAccess(sub, &options->access);
   sub->footer(
       "Example: loka sub /dev/ttyUSB0 -b 9600 -p none --rx-prefix STX --rx-suffix ETX -C 3");
@@ -67,6 +70,11 @@ int RunSub(SubOptions* options) {
   if (!MakePrintOptions(*options, &print, &error)) {
     TellUser("--format: " + error);
     return static_cast<int>(ExitStatus::kUsage);
+  }
+  const auto log = OpenLog(options->logFile, &error);
+  if (!error.empty()) {
+    TellUser(error);
+    return static_cast<int>(ExitStatus::kRefused);
   }
   options->access.acknowledges = !options->isPeek;
   Answer answer;
@@ -81,7 +89,8 @@ int RunSub(SubOptions* options) {
   const Deadline deadline = options->limitSeconds > 0
                                 ? Deadline::After(static_cast<int>(options->limitSeconds * 1000))
                                 : Deadline::After(kForeverMs);
-  answer = instance->Serve(&printer, isDone, deadline);
+  SinkPair sinks(&printer, log.get());
+  answer = instance->Serve(&sinks, isDone, deadline);
   // Without a count the time limit is the way to end.
   if (answer.status == ExitStatus::kTimeout && options->count == 0) {
     answer = Answer();

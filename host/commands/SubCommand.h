@@ -16,6 +16,7 @@ struct SubOptions {
   std::uint64_t count = 0;  // -C; 0: no end
   double limitSeconds = 0;  // -W; 0: no end
   std::string format;       // -F
+  std::string logFile;      // --log; empty: none
   bool isJson = false;
   bool isHex = false;
   bool isDump = false;

@@ -6,6 +6,7 @@
 #include <string>
 
 #include "host/events/EventSink.h"
+#include "host/text/Output.h"
 
 // Appends each event to a file, one line with its time (UTC) and port each, device bytes escaped. A
 // file of 10 MiB is put aside under a number, NAME.1.EXTENSION being the newest; five are kept. Any
@@ -22,3 +23,9 @@ class LogFile : public EventSink {
   static std::unique_ptr<LogFile> Open(const std::string& path, ProblemHandler onProblem,
                                        std::string* error);
 };
+
+// The log for a command that takes one: null without a path, and with the reason in `error` when
+// the file cannot be opened. What goes wrong later is told on standard error.
+inline std::unique_ptr<LogFile> OpenLog(const std::string& path, std::string* error) {
+  return path.empty() ? nullptr : LogFile::Open(path, TellUser, error);
+}
