@@ -338,7 +338,7 @@ void AddReceive(std::vector<Step>& steps) {
                      line.line.size() < 300});
   }
   const auto feed = [](Bench& bench) { bench.Feed("\x02" + std::string(60, 'T') + "\x03"); };
-  steps.push_back({"Receive_QueueIsFull", Tokens::kMayGo,
+  steps.push_back({"Receive_QueueIsFull", Tokens::kMove,
                    [feed](Bench& bench) {
                      bench.Run("token_queue_size=2");
                      feed(bench);

@@ -12,6 +12,7 @@ struct Step {
   // What may become of the two tokens that wait.
   enum class Tokens {
     kStay,   // they are there, whether the operation succeeds or not
+    kMove,   // the older one may have made room for a new one, so there are two all the same
     kMayGo,  // the operation is there to drop them, so they may go
     kNone,   // the step has no tokens
   };
