@@ -125,6 +125,7 @@ CommandTree::CommandTree()
   Add(kKeeping, Make<RunOptions, AddRun, RunRun>());
   Add(kKeeping, Make<DemoOptions, AddDemo, RunDemo>());
   Add(kKeeping, Make<CompletionOptions, AddCompletion, RunCompletion>());
+  Add(kHidden, Make<ManualPageOptions, AddManualPage, RunManualPage>());
   Add(kHidden, Make<WordsOptions, AddWords, RunWords>());
   // The demonstration's own other processes.
   Add(kHidden, Make<DemoDeviceOptions, AddDemoDevice, RunDemoDeviceProcess>());

@@ -2,6 +2,8 @@
 #include "host/commands/CompletionCommand.h"
 
 #include <CLI/CLI.hpp>
+#include <fstream>
+#include <iterator>
 #include <sstream>
 #include <vector>
 
@@ -11,6 +13,7 @@
 #include "host/completion/BashCompletion.h"
 #include "host/completion/CommandModel.h"
 #include "host/completion/FishCompletion.h"
+#include "host/completion/ManualPage.h"
 #include "host/completion/ZshCompletion.h"
 #include "host/control/ControlPath.h"
 #include "host/document/DescriptionBlock.h"
@@ -127,6 +130,24 @@ int RunCompletion(const CompletionOptions& options) {
                            : options.shell == "zsh" ? ZshCompletion(root)
                                                     : FishCompletion(root);
   return static_cast<int>(WriteResult(text) ? ExitStatus::kDone : ExitStatus::kRefused);
+}
+
+void AddManualPage(CLI::App* app, ManualPageOptions* options) {
+  CLI::App* const page = app->add_subcommand("manual-page", "");
+  page->add_option("FILE", options->file)->required()->check(CLI::ExistingFile);
+}
+
+int RunManualPage(const ManualPageOptions& options) {
+  std::ifstream file(options.file);
+  const std::string page((std::istreambuf_iterator<char>(file)), std::istreambuf_iterator<char>());
+  const CommandTree tree;
+  std::string filled;
+  std::string error;
+  if (!FillManualPage(page, ModelOf(tree.App()), &filled, &error)) {
+    TellUser(options.file + ": " + error);
+    return static_cast<int>(ExitStatus::kUsage);
+  }
+  return static_cast<int>(WriteResult(filled) ? ExitStatus::kDone : ExitStatus::kRefused);
 }
 
 void AddWords(CLI::App* app, WordsOptions* options) {

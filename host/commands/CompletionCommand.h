@@ -22,6 +22,16 @@ struct WordsOptions {
   std::string pluginFile;  // for "console"
 };
 
+struct ManualPageOptions {
+  std::string file;  // a page with marks, see FillManualPage
+};
+
+// The hidden command that the build calls for the manual pages.
+void AddManualPage(CLI::App* app, ManualPageOptions* options);
+
+// Prints a manual page, its marks filled. Returns the exit status of the program.
+int RunManualPage(const ManualPageOptions& options);
+
 // The hidden command that completion files ask.
 void AddWords(CLI::App* app, WordsOptions* options);
 

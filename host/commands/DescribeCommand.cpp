@@ -7,7 +7,11 @@
 #include "host/base/ExitStatus.h"
 #include "host/document/DescriptionBlock.h"
 #include "host/document/DescriptionDocument.h"
+#include "host/document/DescriptionForm.h"
 #include "host/document/DescriptionReport.h"
+#include "host/document/DescriptionSchema.h"
+#include "host/framing/ConfigKeyTable.h"
+#include "host/instance/SettingTable.h"
 #include "host/runtime/HostSession.h"
 #include "host/text/Output.h"
 #include "interfaces/IProtocol.h"
@@ -54,6 +58,41 @@ HostResult FetchDescription(const DescribeOptions& options, DescriptionBlock* bl
   return result;
 }
 
+ParameterNotes MakeNotes() {
+  ParameterNotes notes;
+  for (const ConfigKey& key : ConfigKeys()) {
+    ParameterNotes::Note& note = notes.byKey[std::string(key.key)];
+    note.meaning = key.meaning;
+    note.also = key.alsoAccepted;
+    if (key.alsoAccepted.find(' ') == std::string_view::npos) {
+      note.extraEntry = key.alsoAccepted;
+    }
+    if (key.kind == ConfigKey::Kind::kHexText) {
+      note.pattern = "([0-9A-Fa-f]{2})*|none";
+    }
+  }
+  for (const SettingEntry& setting : kSettingTable) {
+    notes.settings.push_back(
+        {setting.key, setting.configKey, TagUri(setting), AllowedValues(setting)});
+  }
+  return notes;
+}
+
+std::string TextFor(const DescribeOptions& options, const DescriptionBlock& block,
+                    const DescriptionDocument& document) {
+  if (options.asXml) {
+    return block.xml;
+  }
+  if (options.asJson) {
+    return DescribeAsJson(block, document);
+  }
+  if (options.asForm) {
+    return DescribeAsForm(block, document, MakeNotes());
+  }
+  return options.asSchema ? DescribeAsSchema(block, document, MakeNotes())
+                          : DescribeAsText(block, document);
+}
+
 }  // namespace
 
 void AddDescribe(CLI::App* app, DescribeOptions* options) {
@@ -68,7 +107,16 @@ void AddDescribe(CLI::App* app, DescribeOptions* options) {
       ->excludes(file);
   CLI::Option* const xml =
       describe->add_flag("--xml", options->asXml, "The document as it stands, XML in UTF-8");
-  describe->add_flag("-j,--json", options->asJson, "The same as JSON")->excludes(xml);
+  CLI::Option* const json =
+      describe->add_flag("-j,--json", options->asJson, "The same as JSON")->excludes(xml);
+  CLI::Option* const form =
+      describe->add_flag("--html", options->asForm, "A page with a form that writes configurations")
+          ->excludes(xml)
+          ->excludes(json);
+  describe->add_flag("--schema", options->asSchema, "A JSON Schema of the configuration")
+      ->excludes(xml)
+      ->excludes(json)
+      ->excludes(form);
   describe->footer("Example: loka describe libLOKA.so --json");
 }
 
@@ -87,8 +135,6 @@ int RunDescribe(const DescribeOptions& options) {
   if (block.name.empty()) {
     block.name = document.Property("name");
   }
-  const std::string text = options.asXml    ? block.xml
-                           : options.asJson ? DescribeAsJson(block, document)
-                                            : DescribeAsText(block, document);
-  return static_cast<int>(WriteResult(text) ? ExitStatus::kDone : ExitStatus::kRefused);
+  const bool isWritten = WriteResult(TextFor(options, block, document));
+  return static_cast<int>(isWritten ? ExitStatus::kDone : ExitStatus::kRefused);
 }
