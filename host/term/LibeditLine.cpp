@@ -238,9 +238,10 @@ void LibeditLine::BeginLine() {
   isBegun_ = true;
   KeepSignalKeysOff();
   if (!start_.empty()) {
+    Hide();
     (void)el_insertstr(editLine_.get(), start_.c_str());
     start_.clear();
-    (void)el_set(editLine_.get(), EL_REFRESH);
+    Show();
   }
 }
 

@@ -70,6 +70,9 @@ class ProgramRun {
     return true;
   }
 
+  // A line on its standard input, which Status ends.
+  bool Type(const std::string& line) const { return process_->WriteLine(line); }
+
   void Signal(int signalNumber) const { process_->Signal(signalNumber); }
 
   // The exit status once the program has ended.
