@@ -29,6 +29,7 @@ void FaultPlan::Clear() {
   nthOfAll_ = 0;
   allFrom_ = 0;
   failed_ = 0;
+  failedOperations_.clear();
   total_ = 0;
 }
 
@@ -40,7 +41,10 @@ bool FaultPlan::IsToFail(const std::string& operation) {
   const bool isToFail = total_ == nthOfAll_ || (allFrom_ != 0 && total_ >= allFrom_) ||
                         always_.count(operation) != 0 ||
                         (found != nth_.end() && found->second.count(nth) != 0);
-  failed_ += isToFail ? 1 : 0;
+  if (isToFail) {
+    ++failed_;
+    failedOperations_.insert(operation);
+  }
   return isToFail;
 }
 
@@ -52,4 +56,9 @@ int FaultPlan::CallCount() const {
 int FaultPlan::FailedCount() const {
   const std::lock_guard<std::mutex> guard(mutex_);
   return failed_;
+}
+
+std::set<std::string> FaultPlan::FailedOperations() const {
+  const std::lock_guard<std::mutex> guard(mutex_);
+  return failedOperations_;
 }

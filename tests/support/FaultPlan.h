@@ -24,6 +24,9 @@ class FaultPlan {
   int CallCount() const;
   int FailedCount() const;
 
+  // The operations of which a call has failed since the last Clear.
+  std::set<std::string> FailedOperations() const;
+
  private:
   mutable std::mutex mutex_;
   std::map<std::string, std::set<int>> nth_;
@@ -32,5 +35,6 @@ class FaultPlan {
   int nthOfAll_ = 0;
   int allFrom_ = 0;
   int failed_ = 0;
+  std::set<std::string> failedOperations_;
   int total_ = 0;
 };
