@@ -55,6 +55,21 @@ TEST_F(PortListTest, LeavesOutWhatHasNoHardware) {
   EXPECT_TRUE(ListPorts(Class().string(), Root().string()).empty());
 }
 
+TEST_F(PortListTest, KnowsTheNameThatStaysOfADeviceWhoseNumberChanges) {
+  fs::create_directories(Root());
+  std::ofstream(Root() / "ttyUSB0") << "";
+  std::ofstream(Root() / "ttyUSB1") << "";
+  AddStableName("usb-A", "ttyUSB1");
+  EXPECT_EQ(StableNameOf((Root() / "ttyUSB1").string(), Root().string()),
+            (Root() / "serial/by-id/usb-A").string());
+  EXPECT_EQ(StableNameOf((Root() / "ttyUSB0").string(), Root().string()), "");
+  EXPECT_EQ(StableNameOf((Root() / "ttyUSB9").string(), Root().string()), "");
+  EXPECT_TRUE(HasChangingName("/dev/ttyUSB0"));
+  EXPECT_TRUE(HasChangingName("/dev/ttyACM12"));
+  EXPECT_FALSE(HasChangingName("/dev/ttyS0"));
+  EXPECT_FALSE(HasChangingName("/dev/serial/by-id/usb-A"));
+}
+
 TEST_F(PortListTest, IsEmptyWithoutTheFolders) {
   EXPECT_TRUE(ListPorts(Class().string(), Root().string()).empty());
 }
