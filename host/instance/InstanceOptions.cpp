@@ -19,7 +19,8 @@ bool MakeHostOptions(const InstanceOptions& options, HostOptions* host, std::str
     }
   }
   host->pluginFile = options.pluginFile;
-  if (!options.withoutStore) {
+  // A program without a store goes on without one, unless a file is asked for.
+  if (!options.withoutStore && (SqliteFile::IsBuiltIn() || !options.storeFile.empty())) {
     host->storeFile = options.storeFile.empty() ? DefaultStorePath() : options.storeFile;
     if (host->storeFile.empty()) {
       *error = "no home folder for the store; name one with --store FILE or use --no-store";

@@ -100,6 +100,8 @@ void SqliteFile::DatabaseCloser::operator()(sqlite3* database) const {
 
 SqliteFile::~SqliteFile() = default;
 
+bool SqliteFile::IsBuiltIn() { return true; }
+
 std::unique_ptr<SqliteFile> SqliteFile::Open(const std::string& path, std::string* error) {
   if (!MakeFolders(fs::path(path).parent_path(), error) || !MakeFile(path, error)) {
     return nullptr;

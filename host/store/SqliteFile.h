@@ -19,6 +19,9 @@ class SqliteFile {
  public:
   using Values = std::map<StoredKey, StoredValue>;
 
+  // Whether this program has a store at all (LOKA_WITH_STORE).
+  static bool IsBuiltIn();
+
   // Opens the file, or makes it (mode 0600) and the folders that are missing (mode 0700). Null,
   // with the reason in `error`, when that fails, when the file is damaged or when it is not a
   // store of ours; such a file is left as it is.
