@@ -42,6 +42,7 @@ TermSession::Settings SettingsOf(const TermOptions& options) {
   settings.hasTime = options.hasTime;
   settings.isQuiet = options.access.isQuiet;
   settings.verbosity = options.access.verbosity;
+  settings.colour = options.access.colour;
   settings.lingerMs = static_cast<int>(options.lingerSeconds * 1000);
   return settings;
 }

@@ -215,6 +215,7 @@ void TermSession::MakePrinter() {
   options.hasTime = settings_.hasTime;
   options.isQuiet = settings_.isQuiet;
   options.verbosity = settings_.verbosity;
+  options.colour = settings_.colour;
   printer_.emplace(options);
 }
 

@@ -30,7 +30,8 @@ class TermSession {
     bool hasTime = false;
     bool isQuiet = false;
     int verbosity = 0;
-    int lingerMs = 0;  // behind the end of an input that is no terminal
+    std::string colour = "auto";  // as TextStyle takes it
+    int lingerMs = 0;             // behind the end of an input that is no terminal
   };
 
   // `events` is the stream of an instance of this process, null for another one's: events that come
