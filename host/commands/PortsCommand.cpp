@@ -19,7 +19,7 @@ std::string Footer() {
   for (const std::string& line : DescribePortOptions()) {
     text += "  ," + line + "\n";
   }
-  text += "Example: --port com1=/dev/ttyUSB0,flow=rtscts,dtr=off";
+  text += "As in: --port com1=/dev/ttyUSB0,flow=rtscts,dtr=off";
   return text;
 }
 

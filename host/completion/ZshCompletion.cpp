@@ -18,6 +18,7 @@ _loka_ask() {
   local -a known
   for kind in "$@"; do
     known=("${(@f)$($_loka_program words $kind 2>/dev/null)}")
+    known=(${known:#})
     compadd -M 'r:|/=* r:|=*' -a known
   done
 }
@@ -124,8 +125,21 @@ std::string Positionals(const CommandModel& command) {
   return lines;
 }
 
+// In front of the command stand options that every command with a driver knows.
+std::string LeadingOptions(const CommandModel& root) {
+  constexpr const char* kNames[] = {"--plugin",  "--profile", "--color",
+                                    "--verbose", "--quiet",   "--json"};
+  std::string lines;
+  for (const OptionModel& option : root.commands.front().options) {
+    const bool isLeading =
+        std::find(std::begin(kNames), std::end(kNames), option.names.back()) != std::end(kNames);
+    lines += isLeading ? OptionLines(option) : "";
+  }
+  return lines;
+}
+
 std::string FunctionOf(const std::string& path, const CommandModel& command) {
-  std::string options;
+  std::string options = path.empty() ? LeadingOptions(command) : "";
   for (const OptionModel& option : command.options) {
     options += OptionLines(option);
   }

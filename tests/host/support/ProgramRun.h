@@ -22,10 +22,11 @@ class ProgramRun {
   explicit ProgramRun(const std::vector<std::string>& arguments,
                       const std::string& environment = "") {
     // The shell takes care of stderr and the environment.
-    const std::string script = "exec env -u NO_COLOR LOKA_PLUGIN='" + PluginLibrary::DefaultPath() +
-                               "' XDG_STATE_HOME='" + folder_.Path().string() +
-                               "' LOKA_RUNTIME_DIR='" + folder_.File("control") + "' " +
-                               environment + " \"$0\" \"$@\" 2>'" + folder_.File("stderr") + "'";
+    const std::string script =
+        "exec env -u NO_COLOR -u LOKA_PORT LOKA_PLUGIN='" + PluginLibrary::DefaultPath() +
+        "' XDG_STATE_HOME='" + folder_.Path().string() + "' XDG_CONFIG_HOME='" +
+        folder_.Path().string() + "' LOKA_RUNTIME_DIR='" + folder_.File("control") + "' " +
+        environment + " \"$0\" \"$@\" 2>'" + folder_.File("stderr") + "'";
     std::vector<std::string> all = {"sh", "-c", script, LOKA_PROGRAM_PATH};
     all.insert(all.end(), arguments.begin(), arguments.end());
     process_ = std::make_unique<ChildProcess>("/bin/sh", all);
