@@ -359,10 +359,16 @@ void AddReceive(std::vector<Step>& steps) {
 
 // --- console and information ---
 
+std::string Repeated(int times, const std::string& text) {
+  std::string repeated;
+  for (int i = 0; i < times; ++i) repeated += text;
+  return repeated;
+}
+
 void AddConsole(std::vector<Step>& steps) {
   const struct {
     const char* name;
-    const char* command;
+    std::string command;
     std::string reply;  // how it begins
     Tokens tokens;
   } commands[] = {
@@ -375,6 +381,8 @@ void AddConsole(std::vector<Step>& steps) {
       {"read", "read 0?rx_token?string-300", "6b657074206f6e6500", Tokens::kStay},
       {"read_number", "read 0?SP_Baud?unsignedInt(swapnibble)", "08520000", Tokens::kStay},
       {"write", "write 0?SP_TxPrefix?string-20 3030303030303030303030303030303030303030",
+       "written ok", Tokens::kStay},
+      {"write_long", "write 0?SP_TxPrefix?string-100 " + Repeated(40, "30") + Repeated(60, "00"),
        "written ok", Tokens::kStay},
       {"connect_OFF", "connect OFF", "OK", Tokens::kStay},
       {"connect_ON", "connect ON", "OK", Tokens::kStay},
@@ -392,15 +400,15 @@ void AddConsole(std::vector<Step>& steps) {
       {"set_txPrefix", "set_txPrefix 020202020202020202020202020202020202", "OK", Tokens::kStay},
       {"set_txSuffix", "set_txSuffix 020202020202020202020202020202020202", "OK", Tokens::kStay}};
   for (const auto& command : commands) {
-    steps.push_back(
-        {std::string("Console_") + command.name, command.tokens, [](Bench& bench) { bench.Run(); },
-         [command](Bench& bench) {
-           bench.reply.fill('\0');
-           const bool result =
-               bench.protocol->DoCommand(command.command, bench.reply.data(), SizeOf(bench.reply));
-           return result && std::strncmp(bench.reply.data(), command.reply.c_str(),
-                                         command.reply.size()) == 0;
-         }});
+    steps.push_back({std::string("Console_") + command.name, command.tokens,
+                     [](Bench& bench) { bench.Run(); },
+                     [command](Bench& bench) {
+                       bench.reply.fill('\0');
+                       const bool result = bench.protocol->DoCommand(
+                           command.command.c_str(), bench.reply.data(), SizeOf(bench.reply));
+                       return result && std::strncmp(bench.reply.data(), command.reply.c_str(),
+                                                     command.reply.size()) == 0;
+                     }});
   }
   steps.push_back(
       {"Console_connect_ON_after_OFF", Tokens::kStay,
