@@ -89,6 +89,8 @@ class LibeditLine final : public LineEditor {
         screen_(std::move(screen)),
         historyFile_(std::move(historyFile)) {}
   ~LibeditLine() override;
+  LibeditLine(const LibeditLine&) = delete;
+  LibeditLine& operator=(const LibeditLine&) = delete;
 
   bool Open();
 

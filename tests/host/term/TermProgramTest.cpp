@@ -2,9 +2,6 @@
 // loka term with lines from a pipe; TermTmuxTest has the keys.
 #include <gtest/gtest.h>
 
-#include <fstream>
-#include <iterator>
-
 #include "tests/host/commands/InstanceRun.h"
 
 namespace {
@@ -106,28 +103,7 @@ TEST_F(TermProgram, ShowsTokensInTheOutputModes) {
   }
 }
 
-TEST_F(TermProgram, LogHasWhatHappenedWithItsTime) {
-  const TemporaryFolder folder;
-  const auto run = Start("rx_suffix=03 tx_suffix=0D", {"--log", folder.File("log")});
-  ASSERT_TRUE(run->Type("R"));
-  EXPECT_EQ(DeviceGets(2), "R\r");
-  ASSERT_TRUE(DeviceSends("A\x03"));
-  EXPECT_EQ(run->Line(), "A");
-  EXPECT_EQ(run->Status(), 0);
-  std::ifstream file(folder.File("log"));
-  const std::string log{std::istreambuf_iterator<char>(file), std::istreambuf_iterator<char>()};
-  EXPECT_TRUE(Holds(log, "Z com1 tx 52 0D  \"R\\r\"\n")) << log;
-  EXPECT_TRUE(Holds(log, "Z com1 token 1  \"A\"  1 bytes\n")) << log;
-}
-
-TEST_F(TermProgram, ALogThatCannotBeIsStatus1) {
-  const TemporaryFolder folder;
-  const auto run = Start("", {"--log", folder.Path().string()});
-  EXPECT_EQ(run->Status(), 1);
-  EXPECT_TRUE(Holds(run->Errors(), "log file: ")) << run->Errors();
-}
-
-TEST_F(TermProgram, LetsOthersAttach) {
+TEST_F(TermProgram, AttachesToARunningInstanceAndEndsWithIt) {
   InstanceRun instance("rx_suffix=03 tx_suffix=0D", "auto");
   ASSERT_TRUE(instance.IsReady()) << instance.Errors();
   const auto run = instance.Begin({"term"});
