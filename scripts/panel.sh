@@ -13,12 +13,15 @@ usage: scripts/panel.sh COMMAND
   build   cross-builds libLOKA.so for armhf and armel, checks both and prints their figures
   check [ABI...]
           runs the unit and plug-in tests for both under user-mode emulation
+  test [GTEST-OPTION...]
+          runs library and reference host in an emulated panel, with a device at its serial line
+  dist    makes an archive for each ABI: library, description, headers, guide, checksums, licence
   help    prints this text
 TEXT
 }
 
 case "${1:-}" in
-  build | check)
+  build | check | test | dist)
     command=$1
     shift
     . "$(dirname "$0")/panel/$command.sh"

@@ -85,3 +85,6 @@ target_googletest() {
 # What the reference host is built with, for the target.
 panel_host_packages=(zlib1g zlib1g-dev libsqlite3-0 libsqlite3-dev libpugixml1v5 libpugixml-dev
   libcli11-dev nlohmann-json3-dev)
+# Without the parts of it that need packages of their own and have nothing to do with a panel.
+panel_host_options=(-DLOKA_WITH_TERM=OFF -DLOKA_WITH_LOG=OFF -DLOKA_WITH_WEB=OFF
+  -DLOKA_WITH_MQTT=OFF --no-warn-unused-cli)

@@ -76,5 +76,8 @@ make_image() {
   cp "$project_dir/scripts/panel/init" "$panel_root/init"
   install_kernel
   for program in "$@"; do install_program "$program"; done
+  # A plug-in test compares the library's description with its source.
+  mkdir -p "$panel_root$project_dir/driver"
+  cp "$project_dir/driver/Xml_LOKA.xml" "$panel_root$project_dir/driver/"
   (cd "$panel_root" && find . | cpio -o -H newc --quiet | gzip -1) >"$panel_image/initramfs.gz"
 }

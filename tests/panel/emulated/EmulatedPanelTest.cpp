@@ -1,0 +1,348 @@
+// SPDX-License-Identifier: Apache-2.0
+// The library and the reference host in an emulated panel, with a simulated device at the other end
+// of the panel's UART. LOKA_PANEL_IMAGE names the folder with kernel and file system.
+#include <gtest/gtest.h>
+
+#include <cstdio>
+#include <cstdlib>
+#include <memory>
+#include <sstream>
+#include <stdexcept>
+#include <string>
+#include <vector>
+
+#include "tests/panel/emulated/EmulatedPanel.h"
+
+namespace {
+
+constexpr const char* kPort = "/dev/ttyS0";
+constexpr const char* kFramed = "--rx-prefix 02 --rx-suffix 03";
+constexpr const char* kOutput = "/tmp/run.out";
+
+std::string ImageFolder() {
+  const char* folder = std::getenv("LOKA_PANEL_IMAGE");
+  return folder != nullptr ? folder : "";
+}
+std::string Disk() { return ImageFolder() + "/disk"; }
+
+std::string Quoted(const std::string& text) { return "'" + text + "'"; }
+
+// One panel for all cases; each starts and ends its own host in it.
+class EmulatedPanelTest : public ::testing::Test {
+ protected:
+  static void SetUpTestSuite() { SwitchOn(); }
+  static void TearDownTestSuite() { panel_.reset(); }
+  static void SwitchOn() {
+    panel_.reset();
+    panel_ = std::make_unique<EmulatedPanel>(ImageFolder(), Disk());
+    Done("export LOKA_RUNTIME_DIR=/run/loka; mkdir -m 700 /run/loka");
+  }
+  void TearDown() override { StopHost(); }
+
+  // A command that must succeed; its output.
+  static std::string Done(const std::string& command) {
+    const EmulatedPanel::Reply reply = panel_->Run(command);
+    EXPECT_EQ(reply.status, 0) << command << "\n" << reply.output;
+    return reply.output;
+  }
+  static bool Holds(const std::string& command) { return panel_->Run(command).status == 0; }
+
+  // Starts `loka run` with these options and waits until others can attach.
+  void StartHost(const std::string& options) {
+    StopHost();
+    Done("loka run " + std::string(kPort) + " --ack never " + options + " >" + kOutput +
+         " 2>&1 & pid=$!");
+    const EmulatedPanel::Reply started = panel_->Run(
+        "until [ -S /run/loka/com1.sock ]; do kill -0 $pid || break; usleep 20000; done; "
+        "[ -S /run/loka/com1.sock ]");
+    if (started.status != 0) throw std::runtime_error(Done("cat " + std::string(kOutput)));
+    isRunning_ = true;
+  }
+  void StopHost() {
+    if (!isRunning_) return;
+    isRunning_ = false;
+    Done("kill -TERM $pid; wait $pid; rm -f /run/loka/com1.sock");
+  }
+
+  static std::string Read(const std::string& tag) { return Done("loka read -q " + Quoted(tag)); }
+  static std::string Available() { return Read("0?tokens_available?unsignedInt"); }
+  static std::string Token() { return Read("0?rx_token?string-100"); }
+  static void Write(const std::string& tag, const std::string& value) {
+    Done("loka write -q " + Quoted(tag) + " " + Quoted(value));
+  }
+  static void Acknowledge() { Write("0?token_ack?boolean", "1"); }
+  static bool WaitForTokens(int count) {
+    return Holds("n=0; until [ \"$(loka read -q '0?tokens_available?unsignedInt')\" = " +
+                 std::to_string(count) + " ] || [ $n = 40 ]; do n=$((n+1)); done; [ $n != 40 ]");
+  }
+  static std::string KernelSettings() { return Done("line_settings " + std::string(kPort)); }
+
+  // Starts the minimal host, which ends after this many tokens; its output goes to /tmp/minimal.
+  static void StartMinimalHost(int tokens, const std::string& settings) {
+    Done("minimal_host /opt/libLOKA.so " + std::string(kPort) + " " + std::to_string(tokens) +
+         " 'CfgVer=1 model=1 port=com1 mode=RS-232 " + settings + "' >/tmp/minimal 2>&1 & pid=$!");
+    Done(
+        "until grep -q started /tmp/minimal; do kill -0 $pid || { cat /tmp/minimal; break; }; "
+        "usleep 50000; done; grep -q started /tmp/minimal");
+  }
+  static void WaitForOutput(std::size_t bytes) {
+    Done("until [ $(wc -c </tmp/minimal) -ge " + std::to_string(bytes) +
+         " ]; do kill -0 $pid || break; usleep 20000; done");
+  }
+
+  static std::unique_ptr<EmulatedPanel> panel_;
+  bool isRunning_ = false;
+};
+
+std::unique_ptr<EmulatedPanel> EmulatedPanelTest::panel_;
+
+TEST_F(EmulatedPanelTest, ItIsOne) {
+  const std::string uart = Done("grep -m 1 tx: /proc/tty/driver/serial");
+  EXPECT_NE(uart.find("16550A"), std::string::npos) << uart;
+  EXPECT_EQ(Done("uname -m"), "armv7l");
+  std::printf("user space after            %lld ms (%s)\n", panel_->StartMs(),
+              Done("uname -r").c_str());
+}
+
+// The demonstration's eleven steps, the device at the end of a real line.
+TEST_F(EmulatedPanelTest, DemonstrationOfReceiving) {
+  StartHost(std::string("--no-store ") + kFramed);
+  panel_->SendOnLine(
+      "\x02"
+      "AB\x03");
+  EXPECT_TRUE(WaitForTokens(1));
+  EXPECT_EQ(Read("0?rx_token_len?unsignedInt"), "2");
+  EXPECT_EQ(Token(), "AB");
+  Acknowledge();
+  EXPECT_EQ(Available(), "0");
+  // Silence drops a beginning.
+  panel_->SendOnLine(
+      "\x02"
+      "A");
+  Done("sleep 2");
+  panel_->SendOnLine(
+      "B\x03\x02"
+      "C\x03");
+  EXPECT_TRUE(WaitForTokens(1));
+  EXPECT_EQ(Token(), "C");
+
+  StartHost("--no-store --rx-prefix 02");
+  panel_->SendOnLine(
+      "\x02"
+      "AB\x02"
+      "CD");
+  EXPECT_TRUE(WaitForTokens(2));
+  EXPECT_EQ(Token(), "AB");
+  Acknowledge();
+  EXPECT_EQ(Token(), "CD");
+
+  StartHost("--no-store --rx-suffix 0D0A");
+  panel_->SendOnLine("12.5 kg\r\n");
+  EXPECT_TRUE(WaitForTokens(1));
+  EXPECT_EQ(Token(), "12.5 kg");
+
+  StartHost("--no-store --gap 300");
+  panel_->SendOnLine("HELLO");
+  EXPECT_TRUE(WaitForTokens(1));
+  panel_->SendOnLine("WORLD");
+  EXPECT_TRUE(WaitForTokens(2));
+  EXPECT_EQ(Token(), "HELLO");
+  Acknowledge();
+  EXPECT_EQ(Token(), "WORLD");
+}
+
+TEST_F(EmulatedPanelTest, DemonstrationOfHexTokensQueueAndSending) {
+  StartHost(std::string("--no-store --hex --queue 3 ") + kFramed);
+  panel_->SendOnLine(std::string("\x02\x00\x1B\xFF\x03", 5));
+  EXPECT_TRUE(WaitForTokens(1));
+  EXPECT_EQ(Token(), "001BFF");
+  panel_->SendOnLine(
+      "\x02"
+      "A\x03\x02"
+      "B\x03\x02"
+      "C\x03\x02"
+      "D\x03");
+  Done("sleep 1");
+  EXPECT_EQ(Available(), "3");
+  for (const char* token : {"42", "43", "44"}) {
+    EXPECT_EQ(Token(), token);
+    Acknowledge();
+  }
+  EXPECT_EQ(Available(), "0");
+
+  StartHost("--no-store --tx-prefix 02 --tx-suffix 0D0A");
+  Write("0?tx_token?string-10", "CD");
+  EXPECT_EQ(panel_->TakeFromLine(5),
+            "\x02"
+            "CD\r\n");
+}
+
+TEST_F(EmulatedPanelTest, DemonstrationOfOverrides) {
+  const std::string options = std::string("--store /tmp/demo.db ") + kFramed;
+  StartHost(options);
+  Write("0?SP_RxSuffix?string-20", "3B");
+  EXPECT_EQ(Read("0?SP_RxSuffix?string-20"), "3B");
+  panel_->SendOnLine(
+      "\x02"
+      "A;B\x03");
+  EXPECT_TRUE(WaitForTokens(1));
+  EXPECT_EQ(Token(), "A;B");
+  Write("0?SP_Done?boolean", "1");
+  EXPECT_EQ(Available(), "0");
+  Done("sleep 1");  // a receive pass that began before keeps its framing
+  panel_->SendOnLine(
+      "\x02"
+      "C\x03;");
+  EXPECT_TRUE(WaitForTokens(1));
+  EXPECT_EQ(Done("loka read -q -x '0?rx_token?string-100'"), "43 03");
+  StartHost(options);
+  EXPECT_EQ(Read("0?SP_RxSuffix?string-20"), "3B");
+  panel_->SendOnLine(
+      "\x02"
+      "D\x03;");
+  EXPECT_TRUE(WaitForTokens(1));
+  EXPECT_EQ(Done("loka read -q -x '0?rx_token?string-100'"), "44 03");
+}
+
+struct LineCase {
+  int rate;
+  const char* parity;
+  int bits;
+  int stop;
+  const char* kernel;
+};
+
+// Every rate, data bits, stop bits and parity of the configuration, as the kernel has them, and a
+// token over the line with each.
+TEST_F(EmulatedPanelTest, ConfiguredLineSettings) {
+  const std::vector<LineCase> cases = {
+      {150, "none", 8, 1, "150 8N1"},       {300, "even", 8, 1, "300 8E1"},
+      {600, "odd", 8, 1, "600 8O1"},        {1200, "mark", 8, 1, "1200 8M1"},
+      {2400, "none", 7, 2, "2400 7N2"},     {4800, "even", 7, 1, "4800 7E1"},
+      {9600, "odd", 7, 2, "9600 7O2"},      {19200, "mark", 7, 2, "19200 7M2"},
+      {38400, "even", 8, 2, "38400 8E2"},   {57600, "odd", 8, 2, "57600 8O2"},
+      {115200, "none", 8, 2, "115200 8N2"},
+  };
+  for (const LineCase& line : cases) {
+    std::ostringstream options;
+    options << "--no-store --rx-suffix 03 --tx-suffix 03 -b " << line.rate << " -p " << line.parity
+            << " -d " << line.bits << " -s " << line.stop;
+    StartHost(options.str());
+    EXPECT_EQ(KernelSettings(), line.kernel);
+    panel_->SendOnLine(std::string(line.kernel) + "\x03");
+    EXPECT_TRUE(WaitForTokens(1)) << line.kernel;
+    EXPECT_EQ(Token(), line.kernel);
+    Write("0?tx_token?string-20", line.kernel);
+    const std::string sent = std::string(line.kernel) + "\x03";
+    EXPECT_EQ(panel_->TakeFromLine(sent.size()), sent);
+  }
+}
+
+// The same at run time, with the parity that only run time has.
+TEST_F(EmulatedPanelTest, LineSettingsAtRunTime) {
+  StartHost("--no-store --rx-suffix 03 -p none");
+  const std::vector<LineCase> cases = {
+      {150, "4", 7, 2, "150 7S2"},       {300, "3", 8, 1, "300 8M1"},
+      {600, "2", 7, 1, "600 7O1"},       {1200, "1", 8, 2, "1200 8E2"},
+      {2400, "0", 8, 1, "2400 8N1"},     {4800, "4", 8, 1, "4800 8S1"},
+      {9600, "3", 7, 1, "9600 7M1"},     {19200, "2", 8, 1, "19200 8O1"},
+      {38400, "1", 7, 2, "38400 7E2"},   {57600, "0", 7, 2, "57600 7N2"},
+      {115200, "0", 8, 1, "115200 8N1"},
+  };
+  for (const LineCase& line : cases) {
+    std::ostringstream tags;
+    tags << "loka write -q '0?SP_Baud?unsignedInt' " << line.rate
+         << " && loka write -q '0?SP_Par?unsignedByte' " << line.parity
+         << " && loka write -q '0?SP_Bits?unsignedByte' " << line.bits
+         << " && loka write -q '0?SP_Stop?unsignedByte' " << line.stop
+         << " && loka write -q '0?SP_Done?boolean' 1";
+    Done(tags.str());
+    EXPECT_EQ(KernelSettings(), line.kernel);
+  }
+}
+
+TEST_F(EmulatedPanelTest, DisconnectAndConnect) {
+  const std::string opened = "ls -l /proc/$pid/fd | grep -c " + std::string(kPort) + "; true";
+  StartHost("--no-store --rx-suffix 03");
+  EXPECT_NE(Done(opened), "0");
+  Write("0?connect?boolean", "0");
+  EXPECT_EQ(Done(opened), "0");
+  EXPECT_EQ(Read("0?connect?boolean"), "0");
+  Write("0?connect?boolean", "1");
+  EXPECT_NE(Done(opened), "0");
+  EXPECT_EQ(Read("0?connect?boolean"), "1");
+  panel_->SendOnLine("AGAIN\x03");
+  EXPECT_TRUE(WaitForTokens(1));
+  EXPECT_EQ(Token(), "AGAIN");
+}
+
+// The device sends at the line's rate, as long as the panel is not further behind than its kernel
+// can keep: an emulator on a busy machine is slower than the line, and that is no loss of the
+// panel's.
+TEST_F(EmulatedPanelTest, AStreamOf100000TokensWithoutLoss) {
+  constexpr int kTokens = 100000;
+  constexpr int kPieceTokens = 2500;
+  constexpr int kPiecesAhead = 3;
+  constexpr int kRate = 115200;
+  StartMinimalHost(kTokens,
+                   "baudrate=115200 parity=none bits=8 stopbits=1 rx_suffix=0A "
+                   "token_queue_size=10000");
+  std::string expected = "started\n";
+  for (int i = 0; i < kTokens;) {
+    std::string piece;
+    for (const int end = i + kPieceTokens; i < end; ++i) {
+      // Four letters count the tokens.
+      for (const int divisor : {17576, 676, 26, 1}) {
+        piece += static_cast<char>('a' + i / divisor % 26);
+      }
+      piece += '\n';
+    }
+    panel_->SendAtRate(piece, kRate);
+    expected += piece;
+    const std::size_t ahead = piece.size() * kPiecesAhead;
+    if (expected.size() > ahead) WaitForOutput(expected.size() - ahead);
+  }
+  WaitForOutput(expected.size());
+  Done("wait $pid");
+  EXPECT_EQ(Done("wc -l </tmp/minimal"), std::to_string(kTokens + 1));
+  const std::string output = Done("cat /tmp/minimal") + "\n";
+  EXPECT_TRUE(output == expected) << "other tokens than those that were sent";
+}
+
+// The library of this build in the panel: the plug-in tests, without the limits of user-mode
+// emulation.
+TEST_F(EmulatedPanelTest, PluginTests) {
+  const EmulatedPanel::Reply reply = panel_->Run(
+      "LOKA_PLUGIN=/opt/libLOKA.so LOKA_STRESS_SECONDS=1 plugin_tests --gtest_brief=1", 600000);
+  EXPECT_EQ(reply.status, 0) << reply.output;
+  EXPECT_NE(reply.output.find("PASSED"), std::string::npos) << reply.output;
+}
+
+TEST_F(EmulatedPanelTest, MinimalHost) {
+  StartMinimalHost(2, "baudrate=19200 parity=odd bits=7 stopbits=2 rx_prefix=02 rx_suffix=03");
+  EXPECT_EQ(KernelSettings(), "19200 7O2");
+  std::printf("one started protocol        %s\n",
+              Done("grep -E 'VmRSS|VmData' /proc/$pid/status | tr -s '\\t\\n ' ' '").c_str());
+  panel_->SendOnLine("\x02ONE\x03\x02TWO\x03");
+  Done("wait $pid");
+  EXPECT_EQ(Done("cat /tmp/minimal"), "started\nONE\nTWO");
+}
+
+// The last case: the panel of the others is gone afterwards.
+TEST_F(EmulatedPanelTest, PowerCutRightAfterDone) {
+  const std::string options = "--store /data/store.db -b 9600 -p none --rx-suffix 03";
+  StartHost(options);
+  Done("loka set -q baud=19200 parity=odd bits=7 stop=2 rx_suffix=0D0A gap=250");
+  panel_->CutPower();
+  isRunning_ = false;
+  SwitchOn();
+  StartHost(options);
+  EXPECT_EQ(KernelSettings(), "19200 7O2");
+  EXPECT_EQ(Read("0?SP_RxSuffix?string-20"), "0D0A");
+  EXPECT_EQ(Read("0?SP_Gap?unsignedInt"), "250");
+  panel_->SendOnLine("BACK\r\n");
+  EXPECT_TRUE(WaitForTokens(1));
+  EXPECT_EQ(Token(), "BACK");
+}
+
+}  // namespace
