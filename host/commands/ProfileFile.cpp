@@ -65,31 +65,30 @@ Profile* SectionNamed(const std::string& name, const std::string& file,
   return &sections->back();
 }
 
-bool ReadItems(const std::string& file, const std::vector<CLI::ConfigItem>& items,
-               std::vector<Profile>* sections, std::string* error) {
-  for (const CLI::ConfigItem& item : items) {
-    const std::string name = SectionOf(item);
-    if (name.empty() && !IsMark(item)) {
-      *error = file + ": " + EscapeBytes(item.name) +
-               " stands in no section; a profile begins with its name, as in [scale]";
-      return false;
-    }
-    if (name.find_first_not_of(kNameCharacters) != std::string::npos) {
-      *error = file + ": [" + EscapeBytes(name) +
-               "] is no name of a profile: letters, digits, _ and - make one";
-      return false;
-    }
-    Profile* const profile = SectionNamed(name, file, sections);
-    if (IsMark(item)) {
-      continue;
-    }
-    const std::string trouble = Trouble(item, *profile);
-    if (!trouble.empty()) {
-      *error = file + ": [" + name + "] " + EscapeBytes(item.name) + " " + trouble;
-      return false;
-    }
-    profile->values.emplace_back(item.name, item.inputs.front());
+bool ReadItem(const std::string& file, const CLI::ConfigItem& item, std::vector<Profile>* sections,
+              std::string* error) {
+  const std::string name = SectionOf(item);
+  if (name.empty() && !IsMark(item)) {
+    *error = file + ": " + EscapeBytes(item.name) +
+             " stands in no section; a profile begins with its name, as in [scale]";
+    return false;
   }
+  if (name.find_first_not_of(kNameCharacters) != std::string::npos) {
+    *error = file + ": [" + EscapeBytes(name) +
+             "] is no name of a profile: letters, digits, _ and - make one";
+    return false;
+  }
+  Profile* const profile = SectionNamed(name, file, sections);
+  if (IsMark(item)) {
+    return true;
+  }
+  const std::string trouble = Trouble(item, *profile);
+  if (!trouble.empty()) {
+    *error = file + ": [" + name + "] ";
+    error->append(EscapeBytes(item.name)).append(" ").append(trouble);
+    return false;
+  }
+  profile->values.emplace_back(item.name, item.inputs.front());
   return true;
 }
 
@@ -104,7 +103,10 @@ bool ReadFile(const std::string& file, std::vector<Profile>* sections, std::stri
     return false;
   }
   try {
-    return ReadItems(file, CLI::ConfigTOML().from_config(stream), sections, error);
+    const std::vector<CLI::ConfigItem> items = CLI::ConfigTOML().from_config(stream);
+    return std::all_of(items.begin(), items.end(), [&](const CLI::ConfigItem& item) {
+      return ReadItem(file, item, sections, error);
+    });
   } catch (const CLI::Error& failure) {
     *error = file + ": " + failure.what();
     return false;

@@ -93,7 +93,7 @@ class ProfileGiver {
 
  private:
   bool IsGiven(const std::string& name) const {
-    return fromCommandLine_.count(command_->get_option_no_throw(name)) > 0;
+    return fromCommandLine_.contains(command_->get_option_no_throw(name));
   }
 
   bool GiveOne(const std::string& key, const std::string& value, std::string* reason) {
@@ -101,17 +101,17 @@ class ProfileGiver {
       return hasConfiguration_ || access_->framing.Preset(key, value, reason);
     }
     CLI::Option* const option = command_->get_option_no_throw(OptionName(key));
-    if (option == nullptr || NamesOfAccess().count(option->get_name()) == 0) {
+    if (option == nullptr || !NamesOfAccess().contains(option->get_name())) {
       *reason = "no such key; loka-config(5) lists them";
       return false;
     }
-    const bool isOfLine = NamesOfLine().count(option->get_name()) > 0;
-    if (fromCommandLine_.count(option) > 0 || (hasPort_ && key == "port") ||
+    const bool isOfLine = NamesOfLine().contains(option->get_name());
+    if (fromCommandLine_.contains(option) || (hasPort_ && key == "port") ||
         (hasConfiguration_ && isOfLine)) {
       return true;
     }
     for (CLI::Option* const excluded : option->get_excludes()) {
-      if (fromCommandLine_.count(excluded) > 0) {
+      if (fromCommandLine_.contains(excluded)) {
         return true;
       }
       if (excluded->count() > 0) {

@@ -87,7 +87,7 @@ class CommandWriter {
         }
         seen.push_back(entry);
         const std::string group = option.group == "Options" ? "Everywhere" : option.group;
-        if (groups.count(group) == 0) {
+        if (!groups.contains(group)) {
           order.push_back(group);
         }
         groups[group] += entry;

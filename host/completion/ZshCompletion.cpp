@@ -98,10 +98,10 @@ std::string OptionLines(const OptionModel& option) {
   const std::string before = option.isRepeated ? "*" : "(" + all + ")";
   const std::string value =
       option.TakesValue() ? ":" + Help(option.typeName) + ":" + Action(option.values) : "";
+  const std::string behind = "[" + Help(option.help) + "]" + value;
   std::string lines;
   for (const std::string& name : option.names) {
-    lines += " \\\n    " + Quoted(before + Named(name, option.TakesValue()) + "[" +
-                                  Help(option.help) + "]" + value);
+    lines += " \\\n    " + Quoted(before + Named(name, option.TakesValue()) + behind);
   }
   return lines;
 }

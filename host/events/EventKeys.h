@@ -6,15 +6,15 @@
 
 // The keys of the events in NDJSON, for the manual page. A test holds the table to EventJson.
 struct EventKey {
-  const char* name;
-  const char* meaning;
-  const char* example;      // a JSON value
-  bool isOptional = false;  // left out when there is nothing to say
+  const char* name = nullptr;
+  const char* meaning = nullptr;
+  const char* example = nullptr;  // a JSON value
+  bool isOptional = false;        // left out when there is nothing to say
 };
 
 struct EventKind {
-  const char* name;  // the value of "ev"
-  const char* meaning;
+  const char* name = nullptr;  // the value of "ev"
+  const char* meaning = nullptr;
   std::vector<EventKey> keys;  // behind t, ev and port, in the order of a line
 };
 
