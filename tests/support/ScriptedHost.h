@@ -42,8 +42,8 @@ class ScriptedHost final : public IInterfaceFactory {
   void SetPresent(const std::string& service) { absent_.erase(service); }
 
   // Manual host: runs the receive task on this thread until the line's script is used up, or until
-  // nobody has taken anything of it for a while. Without a task, or once it has been stopped, nothing
-  // runs.
+  // nobody has taken anything of it for a while. Without a task, or once it has been stopped,
+  // nothing runs.
   void RunUntilSilent(const std::string& port = "com1");
   void RunPasses(int count);
 
