@@ -75,6 +75,8 @@ class EverythingAtOnceTest : public ConsoleFixture {
                    {"0?connect?boolean", "\0"},
                    {"0?connect?boolean", "\1"},
                    {"0?SP_Baud?unsignedInt", "\x80\x25\0"},
+                   {"0?SP_Done?boolean", "\1"},
+                   {"0?SP_Baud?unsignedInt", "\x2C\1\0"},
                    {"0?SP_Bits?unsignedByte", "\7"},
                    {"0?SP_Stop?unsignedByte", "\1"},
                    {"0?SP_Par?unsignedByte", "\4"},
