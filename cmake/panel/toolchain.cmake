@@ -6,6 +6,8 @@ set(CMAKE_C_COMPILER ${LOKA_PANEL_TRIPLET}-gcc)
 set(CMAKE_CXX_COMPILER ${LOKA_PANEL_TRIPLET}-g++)
 # No notes about a calling convention that changed before version 7 of the compiler.
 set(CMAKE_CXX_FLAGS_INIT -Wno-psabi)
+# Tests may count with 64-bit atomics, which ARMv5 leaves to a library; libLOKA's check refuses it.
+set(CMAKE_CXX_STANDARD_LIBRARIES_INIT "-Wl,--push-state,--as-needed -latomic -Wl,--pop-state")
 set(CMAKE_LIBRARY_ARCHITECTURE ${LOKA_PANEL_TRIPLET})
 
 # Libraries for the target that tests and the reference host use; scripts/panel.sh fills the folder.
