@@ -40,6 +40,7 @@ class Replay {
   bool Load(const std::string& pluginFile);
   bool Configure(const std::string& configuration);
   bool MakeTags();
+  void LookNowAndThen();
   void TakeTokens();
   bool Fail(ExitStatus status, const std::string& text);
   bool FailWithDriversText(ExitStatus status);
@@ -53,6 +54,7 @@ class Replay {
   std::unique_ptr<HostTag> token_;
   std::unique_ptr<HostTag> acknowledge_;
   ReplayResult result_;
+  std::size_t looks_ = 0;
 };
 
 Replay::~Replay() {
@@ -71,11 +73,7 @@ Replay::~Replay() {
 ReplayResult Replay::Run(const std::string& pluginFile, const std::string& configuration) {
   if (Load(pluginFile) && Configure(configuration) && MakeTags()) {
     host_.MultiTask().SetBetweenPasses([this] { TakeTokens(); });
-    host_.Port().SetBeforeByte([this](std::size_t number) {
-      if (number % kBytesBetweenLooks == 0) {
-        TakeTokens();
-      }
-    });
+    host_.MultiTask().Semaphore().SetWhenFree([this] { LookNowAndThen(); });
     host_.Task().Run();
     TakeTokens();
   }
@@ -131,6 +129,15 @@ bool Replay::MakeTags() {
   return (make("0?tokens_available?unsignedInt", &available_) && make(kTokenUri, &token_) &&
           make("0?token_ack?boolean", &acknowledge_)) ||
          FailWithDriversText(ExitStatus::kRefused);
+}
+
+// A pass may cut more tokens than the queue holds.
+void Replay::LookNowAndThen() {
+  const std::size_t looks = host_.Port().BytesPlayed() / kBytesBetweenLooks;
+  if (looks != looks_) {
+    looks_ = looks;  // first: taking tokens holds semaphores, too
+    TakeTokens();
+  }
 }
 
 void Replay::TakeTokens() {

@@ -67,6 +67,19 @@ void* ReplaySemaphore::ConvertTo(const char* name) {
   return CompareInterface(name, "ISemaphore") ? this : nullptr;
 }
 
+int ReplaySemaphore::Lock() {
+  ++held_;
+  return 1;
+}
+
+int ReplaySemaphore::Unlock() {
+  --held_;
+  if (held_ == 0 && whenFree_) {
+    whenFree_();
+  }
+  return 1;
+}
+
 void* ReplayTask::ConvertTo(const char* name) {
   return CompareInterface(name, "ITask") ? this : nullptr;
 }

@@ -33,6 +33,9 @@ class ReplayPort final : public ISerialPort {
   // True once a receive has found nothing behind the script's end.
   bool IsPlayed() const { return isPlayed_; }
 
+  // Bytes that the driver has taken.
+  std::size_t BytesPlayed() const { return bytesPlayed_; }
+
   // Called in front of each byte with its number, from 1 on.
   void SetBeforeByte(std::function<void(std::size_t)> action) { beforeByte_ = std::move(action); }
 
@@ -59,12 +62,19 @@ class ReplaySerialFactory final : public ISerialFactory {
   ReplayPort* const port_;
 };
 
-// Never blocks: there is one thread.
+// Never blocks: there is one thread, and one semaphore stands for all that the driver makes.
 class ReplaySemaphore final : public ISemaphore {
  public:
   void* ConvertTo(const char* name) override;
-  int Lock() override { return 1; }
-  int Unlock() override { return 1; }
+  int Lock() override;
+  int Unlock() override;
+
+  // Called each time the driver holds none any more: where a host may call into it.
+  void SetWhenFree(std::function<void()> action) { whenFree_ = std::move(action); }
+
+ private:
+  int held_ = 0;
+  std::function<void()> whenFree_;
 };
 
 // Keeps the runner; whoever owns the host lets it run.
@@ -102,6 +112,8 @@ class ReplayMultiTask final : public IMultiTask2 {
   void reserved11() override {}
   void reserved12() override {}
   ITask* CreateTask(ITaskRunner* runner, int taskClass) override;
+
+  ReplaySemaphore& Semaphore() { return semaphore_; }
 
   // Called between two passes.
   void SetBetweenPasses(std::function<void()> action) { betweenPasses_ = std::move(action); }

@@ -443,7 +443,12 @@ Answer Requests::HandleSend(const Json& request) {
     answer.hints.emplace_back(kHintHexTokens);
     return answer;
   }
+  const std::uint64_t lostBefore = session_->CountersFor(events_->Port()).lostSends;
   Answer answer = Write("0?tx_token?string-" + std::to_string(value.size() + 1), value);
+  // The driver does not look at what the line took.
+  if (answer.IsDone() && session_->CountersFor(events_->Port()).lostSends != lostBefore) {
+    answer = Refusal("the line did not take the token: it is lost, or the device does not read");
+  }
   answer.data["length"] = bytes.size();
   return answer;
 }

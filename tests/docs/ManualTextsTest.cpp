@@ -145,6 +145,8 @@ TEST_F(ManualTextsTest, NoTextOfTheSourcesIsMissing) {
   for (const MarkdownText::Block& block : manual.Blocks()) said += block.text;
   for (const Row& row : manual.Rows("Memory type")) said += row[1] + "\n";
   for (const std::string& source : DriverSources()) {
+    // What it says ends a debug build, in front of the people who work on the driver.
+    if (source == "protlib/LockOrder.cpp") continue;
     for (const std::string& literal : LiteralsOf(source)) {
       if (!HasBlank(literal) || literal.find('\n') != std::string::npos) continue;
       EXPECT_NE(said.find(literal), std::string::npos) << source << ": \"" << literal << "\"";

@@ -18,10 +18,6 @@ constexpr int kPauseMs = 60;
 
 Deadline Limit() { return Deadline::After(ProgramRun::kLimitMs); }
 
-bool Holds(const std::string& text, const std::string& part) {
-  return text.find(part) != std::string::npos;
-}
-
 Words Sub(const PseudoTerminal& line, const std::string& more, const Words& options) {
   Words words = {"sub",         line.Path(), "--config", TestConfiguration(more),
                  "--no-attach", "--no-store"};

@@ -305,8 +305,12 @@ class SimHelp : public testing::TestWithParam<const char*> {
     EXPECT_EQ(help.Status(), 0);
     EXPECT_LE(std::count(text.begin(), text.end(), '\n'), 40) << text;
     std::smatch found;
-    EXPECT_TRUE(std::regex_search(text, found, std::regex(heading + " +loka (.*)"))) << text;
-    return found[1];
+    EXPECT_TRUE(std::regex_search(text, found, std::regex(heading + " +loka (.*(?:\n--.*)*)")))
+        << text;
+    // A line that is too long for the screen goes on in the next one.
+    std::string line = found[1];
+    std::replace(line.begin(), line.end(), '\n', ' ');
+    return line;
   }
 };
 
