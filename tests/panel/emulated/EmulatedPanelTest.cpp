@@ -309,11 +309,18 @@ TEST_F(EmulatedPanelTest, AStreamOf100000TokensWithoutLoss) {
   EXPECT_TRUE(output == expected) << "other tokens than those that were sent";
 }
 
-// The library of this build in the panel: the plug-in tests, without the limits of user-mode
-// emulation.
+// The plug-in tests, with those that user-mode emulation cannot run. The exhaustive comparison
+// keeps one prefix and the slowest megabyte stays out, as there: both take minutes under emulation.
 TEST_F(EmulatedPanelTest, PluginTests) {
+  const std::string comparison = "Prefixes/FramingTest.AgreesWithTheReferenceOnEveryShortLine/";
+  std::string leftOut = "HostileInputTest.AMegabyteOfNodes";
+  for (const char* prefix : {"none", "x02", "x03", "x0203"}) leftOut += ":" + comparison + prefix;
+  // With its path: some tests start the program again.
   const EmulatedPanel::Reply reply = panel_->Run(
-      "LOKA_PLUGIN=/opt/libLOKA.so LOKA_STRESS_SECONDS=1 plugin_tests --gtest_brief=1", 600000);
+      "LOKA_PLUGIN=/opt/libLOKA.so LOKA_STRESS_SECONDS=1 /opt/plugin_tests --gtest_brief=1 "
+      "--gtest_color=no --gtest_filter='-" +
+          leftOut + "' && LOKA_PLUGIN=/opt/libLOKA.so /opt/arm_difference_tests --gtest_brief=1",
+      600000);
   EXPECT_EQ(reply.status, 0) << reply.output;
   EXPECT_NE(reply.output.find("PASSED"), std::string::npos) << reply.output;
 }
