@@ -5,7 +5,7 @@
 
 . "$(dirname "$0")/lib.sh"
 
-need_packages g++ cmake ninja-build zlib1g-dev libcli11-dev nlohmann-json3-dev
+need_packages g++ cmake ninja-build zlib1g-dev libcli11-dev nlohmann-json3-dev binutils
 folder=$project_dir/build/small
 
 say "Building the smallest loka"

@@ -136,7 +136,7 @@ bool ReadFile(const std::string& path, std::string* bytes, std::string* error) {
   }
   errno = 0;
   std::ifstream file(path, std::ios::binary);
-  bytes->resize(size);
+  bytes->resize(static_cast<std::size_t>(size));
   file.read(bytes->data(), static_cast<std::streamsize>(size));
   if (!file.is_open() || file.bad()) {
     *error = errno == 0 ? "cannot be read" : std::strerror(errno);
