@@ -31,17 +31,49 @@ std::vector<std::string> Candidates(const InstanceAccess& access) {
   return names;
 }
 
-// The running instance has the port that the command line names, or that names none.
-bool HasWantedPort(const InstanceAccess& access, const AttachedInstance& instance) {
-  PortMap ports;
+// False, with the reason in `answer`, for port words that are not right.
+bool ReadPortWords(const InstanceAccess& access, PortMap* ports, Answer* answer) {
   for (const std::string& word : access.options.portWords) {
-    std::string ignored;  // whoever starts an instance says what is wrong with a word
-    (void)ports.Add(word, &ignored);
+    std::string error;
+    if (!ports->Add(word, &error)) {
+      *answer = Refusal("port " + word + ": " + error, ExitStatus::kUsage);
+      return false;
+    }
+  }
+  return true;
+}
+
+// The running instance has the port that the command line names; where that names none, any will
+// do.
+bool HasWantedPort(const PortMap& ports, const AttachedInstance& instance) {
+  if (ports.IsEmpty()) {
+    return true;
   }
   const std::string wanted = ports.PathFor(instance.Port());
   const std::string path = instance.Info().value("path", "");
   std::error_code error;
-  return wanted.empty() || wanted == path || std::filesystem::equivalent(wanted, path, error);
+  return !wanted.empty() && (wanted == path || std::filesystem::equivalent(wanted, path, error));
+}
+
+std::string Join(const std::vector<std::string>& words) {
+  std::string text;
+  for (const std::string& word : words) {
+    text += (text.empty() ? "" : ", ") + word;
+  }
+  return text;
+}
+
+Answer NoInstance(const InstanceAccess& access) {
+  std::string text = "no instance is running";
+  if (!access.instanceName.empty()) {
+    text = "no instance " + PrintableUtf8(access.instanceName) + " is running";
+  } else if (!access.options.portWords.empty()) {
+    text += " on this port";
+  }
+  Answer answer = Refusal(text, ExitStatus::kPort);
+  const std::string running = Join(ControlNames());
+  answer.hints.emplace_back(running.empty() ? "loka run starts one" : "running: " + running);
+  return answer;
 }
 
 void TellAttached(const InstanceAccess& access, const AttachedInstance& instance) {
@@ -51,6 +83,10 @@ void TellAttached(const InstanceAccess& access, const AttachedInstance& instance
   const nlohmann::json& info = instance.Info();
   TellUser("attached to the running instance " + instance.Port() + " (process " +
            std::to_string(info.value("pid", 0)) + ", " + info.value("path", "") + ")");
+  if (access.acknowledges && !info.value("ack", true)) {
+    TellUser(
+        "it leaves tokens in the queue (--ack never): each is shown when it is the oldest one");
+  }
   if (access.framing.IsGiven() || !access.configSource.empty()) {
     TellUser("its own configuration holds; that of the command line is left out");
   }
@@ -59,14 +95,6 @@ void TellAttached(const InstanceAccess& access, const AttachedInstance& instance
       !options.pluginFile.empty()) {
     TellUser("its own plug-in and store hold; those of the command line are left out");
   }
-}
-
-std::string Join(const std::vector<std::string>& words) {
-  std::string text;
-  for (const std::string& word : words) {
-    text += (text.empty() ? "" : ", ") + word;
-  }
-  return text;
 }
 
 void AddPortAndStore(CLI::App* command, InstanceAccess* access) {
@@ -124,12 +152,16 @@ void AddAttaching(CLI::App* command, InstanceAccess* access) {
 }  // namespace
 
 std::unique_ptr<Instance> AttachInstance(const InstanceAccess& access, Answer* answer) {
+  PortMap ports;
+  if (!ReadPortWords(access, &ports, answer)) {
+    return nullptr;
+  }
   std::vector<std::unique_ptr<AttachedInstance>> found;
   std::vector<std::string> foundNames;
   for (const std::string& name : Candidates(access)) {
     std::string error;
     auto instance = AttachedInstance::Connect(name, &error);
-    if (instance != nullptr && HasWantedPort(access, *instance)) {
+    if (instance != nullptr && HasWantedPort(ports, *instance)) {
       found.push_back(std::move(instance));
       foundNames.push_back(name);
     }
@@ -142,10 +174,7 @@ std::unique_ptr<Instance> AttachInstance(const InstanceAccess& access, Answer* a
   }
   if (found.empty()) {
     if (access.isAttachWanted || !access.instanceName.empty()) {
-      *answer = Refusal(access.options.portWords.empty() ? "no instance is running"
-                                                         : "no instance is running on this port",
-                        ExitStatus::kPort);
-      answer->hints.emplace_back("loka run starts one");
+      *answer = NoInstance(access);
     }
     return nullptr;
   }
@@ -182,6 +211,18 @@ void AddInstanceAccess(CLI::App* command, InstanceAccess* access, bool hasPortWo
   }
 }
 
+// What the flags say, for the name of the port word.
+std::string ConfigurationOf(const InstanceAccess& access) {
+  PortMap ports;
+  for (const std::string& word : access.options.portWords) {
+    std::string ignored;  // whoever opens the ports says what is wrong with a word
+    (void)ports.Add(word, &ignored);
+  }
+  const std::string name = ports.OnlyName();
+  const std::string configuration = access.framing.Configuration();
+  return name.empty() ? configuration : WithConfigValue(configuration, "port", name);
+}
+
 bool Resolve(InstanceAccess* access, Answer* answer) {
   InstanceOptions& options = access->options;
   std::string error;
@@ -205,7 +246,7 @@ bool Resolve(InstanceAccess* access, Answer* answer) {
   if (!options.configuration.empty()) {
     options.configuration = access->framing.Apply(options.configuration);
   } else if (access->framing.IsGiven() || !options.portWords.empty()) {
-    options.configuration = access->framing.Configuration();
+    options.configuration = ConfigurationOf(*access);
   }
   return true;
 }

@@ -23,13 +23,14 @@ constexpr int kForeverMs = std::numeric_limits<int>::max();
 // it.
 class LogPrinter final : public EventSink {
  public:
-  explicit LogPrinter(int verbosity) : verbosity_(verbosity) {}
+  LogPrinter(int verbosity, bool isQuiet) : verbosity_(verbosity), isQuiet_(isQuiet) {}
 
   void OnEvent(const HostEvent& event) override {
     const bool isTraffic = std::holds_alternative<BytesReceived>(event.detail) ||
-                           std::holds_alternative<BytesSent>(event.detail);
+                           std::holds_alternative<BytesSent>(event.detail) ||
+                           std::holds_alternative<BytesLabelled>(event.detail);
     const bool isToken = std::holds_alternative<TokenReceived>(event.detail);
-    if ((isTraffic && verbosity_ < 2) || (isToken && verbosity_ < 1)) {
+    if (isQuiet_ || (isTraffic && verbosity_ < 2) || (isToken && verbosity_ < 1)) {
       return;
     }
     TellUser(LocalTimeText(event.timeUs) + " " + EventText(event));
@@ -37,6 +38,7 @@ class LogPrinter final : public EventSink {
 
  private:
   const int verbosity_;
+  const bool isQuiet_;
 };
 
 }  // namespace
@@ -73,11 +75,13 @@ int RunRun(RunOptions* options) {
     TellUser(error);
     return static_cast<int>(ExitStatus::kPort);
   }
-  TellUser("tokens are " + std::string(options->access.acknowledges
-                                           ? "taken, published and acknowledged (--ack auto)"
-                                           : "left to those who attach (--ack never)"));
-  TellUser("ready; commands attach at " + ControlPath(instance->Port()));
-  LogPrinter printer(options->access.verbosity);
+  if (!options->access.isQuiet) {
+    TellUser("tokens are " + std::string(options->access.acknowledges
+                                             ? "taken, published and acknowledged (--ack auto)"
+                                             : "left to those who attach (--ack never)"));
+    TellUser("ready; commands attach at " + ControlPath(instance->Port()));
+  }
+  LogPrinter printer(options->access.verbosity, options->access.isQuiet);
   SinkPair sinks(&printer, log.get());
   answer = instance->Serve(
       &sinks, [] { return false; }, Deadline::After(kForeverMs));

@@ -38,7 +38,10 @@ bool MakePrintOptions(const SubOptions& options, PrintOptions* print, std::strin
 
 void AddSub(CLI::App* app, SubOptions* options) {
   CLI::App* const sub = app->add_subcommand("sub", "Print tokens as they come, acknowledge them");
-  sub->add_option("-C,--count", options->count, "End after N tokens")->type_name("N");
+  sub->add_option("-C,--count", options->count, "End after N tokens")
+      ->type_name("N")
+      ->check(
+          CLI::Range(std::uint64_t{1}, std::numeric_limits<std::uint64_t>::max()).description(""));
   sub->add_option("-W,--wait", options->limitSeconds, "End after S seconds; exit status 27")
       ->type_name("S")
       ->check(CLI::Range(0.001, kMaxLimitSeconds).description(""));

@@ -34,7 +34,40 @@ Answer TokenPump::Run(const std::vector<LineRecord>& records, const std::functio
   for (const LineRecord& record : records) {
     Follow(record);
   }
+  if (!acknowledges_) {
+    FollowQueue();
+  }
   return PublishTokens(isDone);
+}
+
+// Nobody here takes tokens: a full queue drops the oldest one for each that comes. When others
+// acknowledge or change settings, the driver's number is where counting starts again.
+void TokenPump::FollowQueue() {
+  const std::uint64_t version = requests_->HeadVersion() + requests_->SettingsVersion();
+  unsigned int waiting = 0;
+  if (!reader_.CountWaiting(&waiting)) {
+    return;
+  }
+  const auto queueTokens = static_cast<unsigned int>(requests_->Framing().queueTokens);
+  if (version != queueVersion_ || waiting > expectedTokens_) {
+    queueVersion_ = version;
+    expectedTokens_ = waiting;
+  }
+  for (; waiting >= queueTokens && expectedTokens_ > waiting; --expectedTokens_) {
+    DropOldest();
+  }
+}
+
+void TokenPump::DropOldest() {
+  std::string bytes;
+  if (head_) {
+    bytes = head_->bytes;
+    head_.reset();
+  } else if (!lineTokens_.empty()) {
+    bytes = lineTokens_.front().bytes;
+    lineTokens_.pop_front();
+  }
+  events_->Publish(BytesDropped{NameOf(DropReason::kQueueFull), bytes, 0}, recordTimeUs_);
 }
 
 // Settings change behind everything that the driver was given before.
@@ -114,6 +147,7 @@ void TokenPump::OnCutToken(const CutToken& token) {
   const std::int64_t firstNs = frameFirstNs_.value_or(recordLastNs_);
   lineTokens_.push_back({token.bytes, std::exchange(frame_, {}),
                          std::max<std::int64_t>(recordLastNs_ - firstNs, 0) / kNsPerUs});
+  ++expectedTokens_;
   frameFirstNs_.reset();
   if (token.endOffset < servedBytes_) {
     frameFirstNs_ = recordFirstNs_;  // the next frame has begun in the same piece

@@ -66,6 +66,8 @@ class TokenPump final : public CheckSink {
   void Follow(const LineRecord& record);
   void FollowBytes(const LineRecord& record);
   void FollowSilence(int silenceMs);
+  void FollowQueue();
+  void DropOldest();
   void FollowSettings();
   Answer PublishTokens(const std::function<bool()>& isDone);
   void PublishToken(const ReceivedToken& token);
@@ -83,6 +85,8 @@ class TokenPump final : public CheckSink {
   std::uint64_t settingsVersion_ = 0;
   std::uint64_t tokenCount_ = 0;
   std::optional<TokenReceived> head_;
+  std::uint64_t expectedTokens_ = 0;  // in the driver's queue, by what the line says
+  std::uint64_t queueVersion_ = 0;
   std::uint64_t headVersion_ = 0;  // Requests::HeadVersion when head_ was read
 
   // Of the frame that is being read from the line.

@@ -27,6 +27,10 @@ class SpdlogFile final : public LogFile {
   }
 
   void OnEvent(const HostEvent& event) override {
+    // The roles of bytes that stand in the log already.
+    if (std::holds_alternative<BytesLabelled>(event.detail)) {
+      return;
+    }
     const std::string line = UtcText(event.timeUs) + " " + event.port + " " + EventText(event);
     try {
       sink_.log(spdlog::details::log_msg("", spdlog::level::info, line));

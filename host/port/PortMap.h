@@ -22,6 +22,11 @@ class PortMap {
   // The path with its options; the path in it is empty when there is none.
   PortOptions OptionsFor(const std::string& portName) const;
 
+  // The name of the only entry, when it is one for a name; empty otherwise.
+  std::string OnlyName() const {
+    return ports_.size() == 1 && barePort_.path.empty() ? ports_.begin()->first : "";
+  }
+
   bool IsEmpty() const { return ports_.empty() && barePort_.path.empty(); }
 
  private:

@@ -18,6 +18,10 @@ constexpr int kPauseMs = 60;
 
 Deadline Limit() { return Deadline::After(ProgramRun::kLimitMs); }
 
+bool Holds(const std::string& text, const std::string& part) {
+  return text.find(part) != std::string::npos;
+}
+
 Words Sub(const PseudoTerminal& line, const std::string& more, const Words& options) {
   Words words = {"sub",         line.Path(), "--config", TestConfiguration(more),
                  "--no-attach", "--no-store"};
@@ -93,7 +97,21 @@ TEST(Complaints, AQueueOfOneHoldsTheNewestValueAndTheOthersAreCounted) {
     value = instance.Output({"read", "0?rx_token?string-16"});
   }
   EXPECT_EQ(value, "3\n");
+  const Json stats = Json::parse(instance.Output({"stats", "-j"}));
+  EXPECT_EQ(stats["drops"].value("queue-full", 0), 2) << stats;
+  EXPECT_EQ(instance.Output({"sub", "-q", "-C", "1"}), "3\n");
   EXPECT_EQ(instance.Output({"read", "0?tokens_available?unsignedInt"}), "1\n");
+}
+
+// A newest value that nobody takes away is shown each time it changes.
+TEST(Complaints, AQueueOfOneIsWatchedWithoutTakingTokens) {
+  const PseudoTerminal line;
+  ProgramRun run(Sub(line, "rx_suffix=03 token_queue_size=1", {"--peek", "-q", "-C", "3"}));
+  for (const char* const token : {"1\x03", "2\x03", "3\x03"}) {
+    ASSERT_TRUE(line.Send(token, Limit()));
+    EXPECT_EQ(run.Line(), std::string(1, token[0]));
+  }
+  EXPECT_EQ(run.Status(), 0);
 }
 
 // "It missed a scan": two equal codes, one behind the other, are two tokens.
@@ -122,6 +140,64 @@ TEST(Complaints, ASendOnALostLineIsToldAndCounted) {
   EXPECT_EQ(send.Status(), 1) << send.Errors();
   ProgramRun stats({"stats", "-j"}, environment);
   EXPECT_EQ(Json::parse(stats.Output()).value("lost_sends", 0), 1);
+}
+
+// "I sent it to the wrong device": a port that is not the running one, or not right, never is.
+TEST(Complaints, AnotherPortIsNeverTheRunningInstance) {
+  InstanceRun instance("rx_suffix=03");
+  ASSERT_TRUE(instance.IsReady()) << instance.Errors();
+  const PseudoTerminal other;
+  for (const auto& [word, status] :
+       std::vector<std::pair<std::string, int>>{{"com2=/dev/does-not-exist", 5},
+                                                {"com99=" + other.Path(), 2},
+                                                {instance.Line().Path() + ",flow=x", 2}}) {
+    const InstanceRun::Result result = instance.Loka({"send", word, "-m", "R"});
+    EXPECT_EQ(result.status, status) << word << ": " << result.errors;
+    EXPECT_FALSE(Holds(result.errors, "attached")) << result.errors;
+  }
+  EXPECT_EQ(instance.Loka({"send", "com2=" + other.Path(), "--tx-suffix", "03", "-m", "R"}).status,
+            0);
+  std::string sent;
+  EXPECT_TRUE(other.Receive(2, Limit(), &sent));
+  EXPECT_EQ(sent, "R\x03");
+  const InstanceRun::Result none = instance.Loka({"stats", "--instance", "com7"});
+  EXPECT_EQ(none.status, 5);
+  EXPECT_TRUE(Holds(none.errors, "no instance com7 is running")) << none.errors;
+  EXPECT_TRUE(Holds(none.errors, "running: com1")) << none.errors;
+}
+
+// A log of a service: nothing but what is asked for.
+TEST(Complaints, ARunningInstanceSaysOnlyWhatItIsAskedFor) {
+  const TemporaryFolder folder;
+  const PseudoTerminal line;
+  const std::string environment = "LOKA_RUNTIME_DIR='" + folder.File("control") + "'";
+  ProgramRun run({"run", line.Path(), "--config", TestConfiguration("rx_suffix=03"), "--no-store"},
+                 environment);
+  ASSERT_TRUE(run.AwaitErrors("commands attach at")) << run.Errors();
+  ProgramRun sub({"sub", "-C", "1"}, environment);
+  ASSERT_TRUE(sub.AwaitErrors("attached")) << sub.Errors();
+  ASSERT_TRUE(line.Send("A\x03", Limit()));
+  EXPECT_EQ(sub.Output(), "A\n");
+  run.Signal(SIGTERM);
+  EXPECT_EQ(run.Status(), 128 + SIGTERM);
+  EXPECT_FALSE(Holds(run.Errors(), "body")) << run.Errors();
+  ProgramRun quiet({"run", line.Path(), "--no-store", "-q"}, environment);
+  ProgramRun stats({"stats", "-j"}, environment);
+  (void)stats.Output();
+  quiet.Signal(SIGTERM);
+  (void)quiet.Status();
+  EXPECT_EQ(quiet.Errors(), "");
+}
+
+// A script must not take a full disk for success.
+TEST(Complaints, AResultThatHasNotGoneOutIsNoSuccess) {
+  for (const char* const command :
+       {"config new", "ports -j", "--help", "--version", "explain 41", "completion bash"}) {
+    ChildProcess process(
+        "/bin/sh", {"sh", "-c", std::string("exec \"$0\" ") + command + " >/dev/full 2>/dev/null",
+                    LOKA_PROGRAM_PATH});
+    EXPECT_EQ(process.Wait(Limit()), 1) << command;
+  }
 }
 
 }  // namespace
