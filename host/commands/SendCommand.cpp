@@ -2,6 +2,7 @@
 #include "host/commands/SendCommand.h"
 
 #include <CLI/CLI.hpp>
+#include <filesystem>
 #include <fstream>
 #include <iostream>
 #include <iterator>
@@ -33,17 +34,20 @@ bool ReadFile(const std::string& path, std::string* bytes, std::string* error) {
     return ReadAll(&std::cin, bytes, error);
   }
   std::ifstream stream(path, std::ios::binary);
-  if (!stream) {
+  if (!stream || std::filesystem::is_directory(path)) {
     *error = path + " cannot be read";
     return false;
   }
   return ReadAll(&stream, bytes, error);
 }
 
-// Every line of standard input as a token of its own, without its line end.
+// Every line of standard input as a token of its own, without its line end (LF or CR LF).
 Answer SendLines(Instance* instance) {
   std::string line;
   while (instance->StopSignal() == 0 && std::getline(std::cin, line)) {
+    if (!line.empty() && line.back() == '\r') {
+      line.pop_back();
+    }
     Answer answer = SendBytes(instance, line);
     if (!answer.IsDone()) {
       return answer;

@@ -333,7 +333,7 @@ bool ReadImport(const std::string& path, std::string* text, std::string* error) 
   std::ifstream file;
   if (path != "-") {
     file.open(path, std::ios::binary);
-    if (!file) {
+    if (!file || std::filesystem::is_directory(path)) {
       *error = path + " cannot be read";
       return false;
     }

@@ -42,7 +42,8 @@ void AddSub(CLI::App* app, SubOptions* options) {
       ->type_name("N")
       ->check(
           CLI::Range(std::uint64_t{1}, std::numeric_limits<std::uint64_t>::max()).description(""));
-  sub->add_option("-W,--wait", options->limitSeconds, "End after S seconds; exit status 27")
+  sub->add_option("-W,--wait", options->limitSeconds,
+                  "End after S seconds: status 27 without the tokens of -C")
       ->type_name("S")
       ->check(CLI::Range(0.001, kMaxLimitSeconds).description(""));
   CLI::Option* const format =

@@ -189,6 +189,26 @@ TEST(Complaints, ARunningInstanceSaysOnlyWhatItIsAskedFor) {
   EXPECT_EQ(quiet.Errors(), "");
 }
 
+// Windows files end lines with CR LF; a folder is no file.
+TEST(Complaints, LinesAndFilesToSendAreTakenAsPeopleMeanThem) {
+  const PseudoTerminal line;
+  const TemporaryFolder folder;
+  std::ofstream(folder.File("lines")) << "a\r\nb\n";
+  const std::string send = "send " + line.Path() + " --tx-suffix 0D --no-store --no-attach ";
+  ChildProcess lines("/bin/sh",
+                     {"sh", "-c",
+                      "exec \"$0\" " + send + "-l -q <'" + folder.File("lines") + "' --plugin '" +
+                          PluginLibrary::DefaultPath() + "' 2>/dev/null",
+                      LOKA_PROGRAM_PATH});
+  EXPECT_EQ(lines.Wait(Limit()), 0);
+  std::string sent;
+  EXPECT_TRUE(line.Receive(4, Limit(), &sent));
+  EXPECT_EQ(sent, "a\rb\r");
+  ProgramRun run({"send", line.Path(), "-f", folder.Path().string()});
+  EXPECT_EQ(run.Status(), 2);
+  EXPECT_TRUE(Holds(run.Errors(), "cannot be read")) << run.Errors();
+}
+
 // A script must not take a full disk for success.
 TEST(Complaints, AResultThatHasNotGoneOutIsNoSuccess) {
   for (const char* const command :
