@@ -115,7 +115,7 @@ int Profiles() {
   for (const Profile& profile : profiles) {
     std::string line = profile.name + "  " + profile.file;
     for (const auto& [key, value] : profile.values) {
-      line += "  " + key + "=" + value;
+      line.append("  ").append(key).append("=").append(value);
     }
     (void)std::printf("%s\n", EscapeBytes(line).c_str());
     if (!CheckProfile(profile, &error)) {

@@ -36,7 +36,7 @@ bool ReadPortWords(const InstanceAccess& access, PortMap* ports, Answer* answer)
   for (const std::string& word : access.options.portWords) {
     std::string error;
     if (!ports->Add(word, &error)) {
-      *answer = Refusal("port " + word + ": " + error, ExitStatus::kUsage);
+      *answer = Refusal(error.insert(0, "port " + word + ": "), ExitStatus::kUsage);
       return false;
     }
   }
