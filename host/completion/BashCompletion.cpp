@@ -74,7 +74,11 @@ std::string Tables(const CommandModel& root) {
     for (std::size_t i = command.positionals.size(); i > 0; --i) {
       const PositionalModel& positional = command.positionals[i - 1];
       const bool isLeftOut = !positional.isRequired && !offers.empty();
-      offers = isLeftOut ? ";" + offers : "";
+      if (isLeftOut) {
+        offers.insert(0, ";");
+      } else {
+        offers.clear();
+      }
       offers.insert(0, Offer(positional.values));
       values[placed.path + " " + std::to_string(i)] = offers;
     }

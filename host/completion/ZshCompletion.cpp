@@ -101,7 +101,9 @@ std::string OptionLines(const OptionModel& option) {
   const std::string behind = "[" + Help(option.help) + "]" + value;
   std::string lines;
   for (const std::string& name : option.names) {
-    lines += " \\\n    " + Quoted(before + Named(name, option.TakesValue()) + behind);
+    std::string argument = before;
+    argument.append(Named(name, option.TakesValue())).append(behind);
+    lines.append(" \\\n    ").append(Quoted(argument));
   }
   return lines;
 }

@@ -95,14 +95,14 @@ std::string Choice(const Parameter& parameter, const std::vector<std::string>& e
 }
 
 std::string Number(const Parameter& parameter) {
-  std::string text = "<input type=\"number\" step=\"1\" required=\"required\"" + Common(parameter);
+  std::string text = R"(<input type="number" step="1" required="required")" + Common(parameter);
   text += parameter.min ? Attribute("min", std::to_string(*parameter.min)) : "";
   text += parameter.max ? Attribute("max", std::to_string(*parameter.max)) : "";
   return text + Attribute("value", parameter.defaultText) + " />";
 }
 
 std::string Text(const Parameter& parameter, const ParameterNotes::Note& note) {
-  return "<input type=\"text\" autocomplete=\"off\" spellcheck=\"false\"" + Common(parameter) +
+  return R"(<input type="text" autocomplete="off" spellcheck="false")" + Common(parameter) +
          (note.pattern.empty() ? "" : Attribute("pattern", note.pattern)) +
          Attribute("value", parameter.defaultText) + " />";
 }
