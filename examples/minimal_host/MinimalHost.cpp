@@ -125,13 +125,13 @@ int main(int argc, char** argv) {
   host.serialFactory.device = argv[2];
   if (module->Init(&host) == 0) return std::fprintf(stderr, "%s\n", module->GetLastError()), 3;
   IProtocol* const protocol = protocols->CreateProtocol("LOKA");
-  if (protocol->Config(argv[4]) == 0 || protocol->Start() == 0)
-    return std::fprintf(stderr, "%s\n", protocol->GetLastErrorString()), 4;
+  const bool isStarted = protocol->Config(argv[4]) != 0 && protocol->Start() != 0;
+  if (!isStarted) (void)std::fprintf(stderr, "%s\n", protocol->GetLastErrorString());
   ITag* const available = protocol->CreateTag("0?tokens_available?unsignedInt");
   ITag* const token = protocol->CreateTag("0?rx_token?string-1000");
   ITag* const acknowledge = protocol->CreateTag("0?token_ack?boolean");
-  std::puts("started");
-  for (int left = std::stoi(argv[3]); left > 0; (void)std::fflush(stdout)) {
+  if (isStarted) std::puts("started");
+  for (int left = isStarted ? std::stoi(argv[3]) : 0; left > 0; (void)std::fflush(stdout)) {
     unsigned int count = 0;
     unsigned char text[1001];
     (void)protocol->Read(available, reinterpret_cast<unsigned char*>(&count));
@@ -145,5 +145,5 @@ int main(int argc, char** argv) {
   protocol->Stop();
   protocols->DeleteProtocol(protocol);  // with its tags
   module->Close();
-  return dlclose(library);
+  return dlclose(library) == 0 && isStarted ? 0 : 4;
 }
