@@ -125,7 +125,7 @@ TEST(CmdProgram, TrueIsStatus0WhateverTheTextSays) {
   const PseudoTerminal line;
   ProgramRun run(OnPort(line.Path(), {"set_rxGap", "soon"}));
   EXPECT_EQ(run.Output(), "ERROR: wrong value\n");
-  EXPECT_EQ(run.Status(), 0);
+  EXPECT_EQ(run.Status(), 0) << run.Errors();
 }
 
 TEST(CmdProgram, WordsAreJoinedWithOneBlankAndEndTheOptions) {
@@ -147,7 +147,7 @@ TEST(CmdProgram, WordsAreJoinedWithOneBlankAndEndTheOptions) {
     EXPECT_TRUE(line.Receive(expected.size(), Deadline::After(kLimitMs), &seen));
     EXPECT_EQ(seen, expected);
     EXPECT_EQ(run.Output(), "OK\n");
-    EXPECT_EQ(run.Status(), 0);
+    EXPECT_EQ(run.Status(), 0) << run.Errors();
   }
 }
 
