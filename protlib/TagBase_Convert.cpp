@@ -76,8 +76,8 @@ bool TagBase::Convert(const unsigned char* src, unsigned char* dst, bool toDevic
     return false;
   }
   return NoThrow(false, [&] {
-    constexpr std::size_t kStackBytes = 256;
-    WorkBuffer<kStackBytes> work(std::max(GetVarLength(), PackedLen()));
+    constexpr std::size_t kWorkBytes = 256;
+    WorkBuffer<kWorkBytes> work(std::max(GetVarLength(), PackedLen()));
     if (!work.IsValid()) {
       return false;
     }

@@ -22,7 +22,7 @@ namespace {
 
 using Json = nlohmann::json;
 
-constexpr std::size_t kMaxLineBytes = std::size_t{16} * 1024 * 1024;
+constexpr std::size_t kMaxReplyLineBytes = std::size_t{16} * 1024 * 1024;
 // Long enough for a request that waits for a port with the longest usual gap.
 constexpr int kAnswerLimitMs = 60 * 1000;
 
@@ -71,7 +71,7 @@ std::unique_ptr<AttachedInstance> AttachedInstance::Connect(const std::string& i
 }
 
 AttachedInstance::AttachedInstance(int descriptor)
-    : descriptor_(descriptor), input_(kMaxLineBytes), signals_([this](int signalNumber) {
+    : descriptor_(descriptor), input_(kMaxReplyLineBytes), signals_([this](int signalNumber) {
         int none = 0;
         (void)stopSignal_.compare_exchange_strong(none, signalNumber);
         stop_.Raise();

@@ -19,6 +19,7 @@
 #include <utility>
 #include <vector>
 
+#include "host/base/SystemError.h"
 #include "host/control/ControlPath.h"
 #include "host/control/PeerUser.h"
 #include "host/events/EventJson.h"
@@ -33,8 +34,6 @@ constexpr std::size_t kMaxRequestBytes = std::size_t{1024} * 1024;
 constexpr std::size_t kMaxWaitingBytes = std::size_t{1024} * 1024;  // of events, for one client
 constexpr int kBacklog = 16;
 constexpr std::size_t kMaxClients = 64;
-
-std::string ErrorText() { return std::generic_category().message(errno); }
 
 bool MakeAddress(const std::string& path, sockaddr_un* address, std::string* error) {
   *address = {};
@@ -54,7 +53,7 @@ int Listening(const std::string& path, std::string* error) {
   }
   const int descriptor = socket(AF_UNIX, SOCK_STREAM | SOCK_CLOEXEC | SOCK_NONBLOCK, 0);
   if (descriptor < 0) {
-    *error = ErrorText();
+    *error = SystemErrorText(errno);
     return -1;
   }
   (void)unlink(path.c_str());
@@ -64,7 +63,7 @@ int Listening(const std::string& path, std::string* error) {
       bind(descriptor, reinterpret_cast<const sockaddr*>(&address), sizeof address) == 0;
   (void)umask(formerMask);
   if (!isBound || listen(descriptor, kBacklog) != 0) {
-    *error = path + ": " + ErrorText();
+    *error = path + ": " + SystemErrorText(errno);
     (void)close(descriptor);
     return -1;
   }
@@ -76,7 +75,7 @@ int LockName(const std::string& path, std::string* error) {
   const std::string lockPath = path + ".lock";
   const int descriptor = open(lockPath.c_str(), O_RDWR | O_CREAT | O_CLOEXEC | O_NOFOLLOW, 0600);
   if (descriptor < 0) {
-    *error = lockPath + ": " + ErrorText();
+    *error = lockPath + ": " + SystemErrorText(errno);
     return -1;
   }
   if (flock(descriptor, LOCK_EX | LOCK_NB) != 0) {

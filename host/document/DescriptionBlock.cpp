@@ -15,7 +15,7 @@ namespace {
 constexpr std::string_view kStartMarker = "<<VADO_XML_START>>";
 constexpr std::string_view kLengthKey = "compressedXML=";
 constexpr std::string_view kEndMarker{"<<VADO_XML_END>>\0", 17};
-constexpr std::size_t kMaxLineBytes = 1024;
+constexpr std::size_t kMaxSkippedLineBytes = 1024;
 // A driver library has a few megabytes at most, debug information included.
 constexpr std::uintmax_t kMaxFileBytes = 64UL * 1024 * 1024;
 // Each start marker may cost one attempt to inflate.
@@ -33,7 +33,7 @@ int WholeNumber(std::string_view text, int largest) {
 
 // Takes the text up to the next zero byte, which goes too. False when there is none near.
 bool TakeLine(std::string_view* bytes, std::string_view* line) {
-  const std::size_t end = bytes->substr(0, kMaxLineBytes).find('\0');
+  const std::size_t end = bytes->substr(0, kMaxSkippedLineBytes).find('\0');
   if (end == std::string_view::npos) {
     return false;
   }

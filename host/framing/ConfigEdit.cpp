@@ -9,9 +9,10 @@
 #include <iostream>
 #include <sstream>
 
+#include "host/framing/ConfigText.h"
+
 namespace {
 
-constexpr const char* kWhiteSpace = " \t\n\v\f\r";
 constexpr const char* kMarker = "CfgVer=1";
 constexpr const char* kNextMarker = "CfgVer=";
 constexpr std::size_t kMaxBytes = 1024UL * 1024UL;
@@ -38,7 +39,7 @@ std::size_t FindValue(const std::string& text, Range section, const std::string&
   for (std::size_t at = text.find(wanted, section.begin);
        at != std::string::npos && at + wanted.size() <= section.end;
        at = text.find(wanted, at + 1)) {
-    if (at == section.begin || std::strchr(kWhiteSpace, text[at - 1]) != nullptr) {
+    if (at == section.begin || std::strchr(kConfigWhiteSpace, text[at - 1]) != nullptr) {
       return at + wanted.size();
     }
   }
@@ -100,12 +101,12 @@ std::string WithConfigValue(const std::string& configuration, const std::string&
   }
   const std::size_t at = FindValue(text, section, key);
   if (at != std::string::npos) {
-    const std::size_t end = std::min(text.find_first_of(kWhiteSpace, at), section.end);
+    const std::size_t end = std::min(text.find_first_of(kConfigWhiteSpace, at), section.end);
     return text.replace(at, end - at, value);
   }
   const bool isLast = section.end == text.size();
   std::size_t end = section.end;
-  while (end > section.begin && std::strchr(kWhiteSpace, text[end - 1]) != nullptr) {
+  while (end > section.begin && std::strchr(kConfigWhiteSpace, text[end - 1]) != nullptr) {
     --end;
   }
   return text.replace(end, section.end - end, " " + key + "=" + value + (isLast ? "" : " "));

@@ -3,8 +3,6 @@
 
 namespace {
 
-constexpr const char* kWhiteSpace = " \t\n\v\f\r";
-
 std::string Section(const std::string& configuration) {
   const std::string marker = "CfgVer=1";
   const std::size_t start = configuration.find(marker);
@@ -24,9 +22,9 @@ std::string ConfigValue(const std::string& configuration, const std::string& key
   const std::string wanted = key + "=";
   for (std::size_t at = text.find(wanted); at != std::string::npos;
        at = text.find(wanted, at + 1)) {
-    if (at == 0 || std::string(kWhiteSpace).find(text[at - 1]) != std::string::npos) {
+    if (at == 0 || std::string(kConfigWhiteSpace).find(text[at - 1]) != std::string::npos) {
       const std::size_t begin = at + wanted.size();
-      const std::size_t end = text.find_first_of(kWhiteSpace, begin);
+      const std::size_t end = text.find_first_of(kConfigWhiteSpace, begin);
       return text.substr(begin, end == std::string::npos ? end : end - begin);
     }
   }

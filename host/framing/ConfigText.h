@@ -3,6 +3,9 @@
 
 #include <string>
 
+// What stands between the keys of a configuration text.
+inline constexpr const char* kConfigWhiteSpace = " \t\n\v\f\r";
+
 // The few things that the host itself looks up in a configuration text, for its messages. The
 // driver alone decides what the text means. Any thread.
 

@@ -5,6 +5,7 @@
 #include <utility>
 
 #include "host/base/Deadline.h"
+#include "host/base/Nanoseconds.h"
 #include "host/events/WallClock.h"
 
 namespace {
@@ -12,7 +13,6 @@ namespace {
 // What may wait for a serving thread that is busy. Beyond it bytes are counted, not kept: the
 // driver has them all the same.
 constexpr std::size_t kMaxKeptBytes = std::size_t{8} * 1024 * 1024;
-constexpr std::int64_t kNsPerUs = 1000;
 
 std::int64_t MonotonicNs() {
   return std::chrono::duration_cast<std::chrono::nanoseconds>(

@@ -4,6 +4,7 @@
 #include <algorithm>
 #include <utility>
 
+#include "host/base/Nanoseconds.h"
 #include "host/events/EventStream.h"
 #include "host/instance/Requests.h"
 #include "host/port/ErrorName.h"
@@ -12,7 +13,6 @@ namespace {
 
 // More of the line's tokens than any queue of the driver holds are not worth keeping.
 constexpr std::size_t kMaxLineTokens = 20000;
-constexpr std::int64_t kNsPerUs = 1000;
 constexpr int kLineWaitMs = 50;
 
 }  // namespace

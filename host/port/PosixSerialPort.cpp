@@ -4,6 +4,7 @@
 #include <algorithm>
 #include <utility>
 
+#include "host/base/Nanoseconds.h"
 #include "host/port/MonotonicTime.h"
 #include "host/port/PortList.h"
 #include "interfaces/CompareInterface.h"
@@ -11,7 +12,6 @@
 namespace {
 
 constexpr int kLeaveStepMs = 1;
-constexpr std::int64_t kNsPerMs = 1'000'000;
 
 // The by-id name where the device has one; the path as it was given where it has none.
 std::string ReturnPathFor(const std::string& path) {

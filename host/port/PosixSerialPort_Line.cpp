@@ -9,6 +9,8 @@
 #include <system_error>
 #include <utility>
 
+#include "host/base/Nanoseconds.h"
+#include "host/base/SystemError.h"
 #include "host/port/MonotonicTime.h"
 #include "host/port/PortHolder.h"
 #include "host/port/PosixSerialPort.h"
@@ -17,9 +19,6 @@ namespace {
 
 constexpr std::size_t kReadBytes = 4096;
 constexpr int kLookForRoomMs = 100;
-constexpr std::int64_t kNsPerMs = 1'000'000;
-
-std::string ErrorText(int errorNumber) { return std::generic_category().message(errorNumber); }
 
 }  // namespace
 
@@ -43,7 +42,7 @@ void PosixSerialPort::ServeLine(const std::shared_ptr<SerialDevice>& device) {
       {{device->FileDescriptor(), POLLIN, 0}, {cancelled_.FileDescriptor(), POLLIN, 0}}};
   if (poll(waits.data(), waits.size(), -1) < 0) {
     if (errno != EINTR) {
-      Lose(device, ErrorText(errno), errno);
+      Lose(device, SystemErrorText(errno), errno);
     }
     return;
   }
@@ -63,7 +62,7 @@ void PosixSerialPort::ServeLine(const std::shared_ptr<SerialDevice>& device) {
       Lose(device, "the other end hung up", device->ErrorNumber());
       break;
     case Found::kError:
-      Lose(device, ErrorText(errno), errno);
+      Lose(device, SystemErrorText(errno), errno);
       break;
   }
 }

@@ -8,6 +8,7 @@
 #include <cerrno>
 #include <limits>
 
+#include "host/base/Nanoseconds.h"
 #include "host/port/LineSettings.h"
 #include "host/port/MonotonicTime.h"
 #include "host/port/PosixSerialPort.h"
@@ -15,8 +16,7 @@
 namespace {
 
 constexpr int kSendBaseLimitMs = 1000;
-constexpr int kDrainStepMs = 1;
-constexpr std::int64_t kNsPerMs = 1'000'000;
+constexpr int kSendDrainStepMs = 1;
 
 }  // namespace
 
@@ -134,7 +134,7 @@ bool PosixSerialPort::AwaitSent(const SerialDevice& device, const Deadline& dead
     if (deadline.HasPassed() || isCancelled_.load()) {
       return false;
     }
-    Deadline::After(kDrainStepMs).Sleep();
+    Deadline::After(kSendDrainStepMs).Sleep();
   }
   return true;
 }

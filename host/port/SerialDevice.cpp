@@ -15,6 +15,7 @@
 #include <system_error>
 
 #include "host/base/Deadline.h"
+#include "host/base/SystemError.h"
 #include "host/port/LinuxRs485.h"
 
 namespace {
@@ -24,8 +25,6 @@ constexpr int kDrainStepMs = 5;
 
 // ASYNC_LOW_LATENCY is an unsigned number, the flags are not.
 constexpr int kLowLatency = static_cast<int>(ASYNC_LOW_LATENCY);
-
-std::string ErrorText(int errorNumber) { return std::generic_category().message(errorNumber); }
 
 void SetProblem(PortProblem* problem, PortProblem::Kind kind, const std::string& text) {
   problem->kind = kind;
@@ -58,7 +57,7 @@ void SetOpenProblem(int errorNumber, PortProblem* problem) {
       SetBusy(problem);
       break;
     default:
-      SetProblem(problem, PortProblem::Kind::kOther, ErrorText(errorNumber));
+      SetProblem(problem, PortProblem::Kind::kOther, SystemErrorText(errorNumber));
   }
 }
 
@@ -178,7 +177,7 @@ void SerialDevice::SetModemLine(const char* name, PortOptions::Level level, int 
   const bool isOn = level == PortOptions::Level::kOn;
   if (calls_.Ioctl(fileDescriptor_, isOn ? TIOCMBIS : TIOCMBIC, &bit) != 0) {
     openingNotes_.push_back(std::string(name) + (isOn ? "=on" : "=off") +
-                            " has no effect, the line answers: " + ErrorText(errno));
+                            " has no effect, the line answers: " + SystemErrorText(errno));
   }
 }
 
@@ -208,12 +207,12 @@ bool SerialDevice::Apply(const LineSettings& settings, std::string* why, std::st
   }
   termios line{};
   if (calls_.GetLine(fileDescriptor_, &line) != 0 || !BuildTermios(settings, &line)) {
-    *why = "the device refuses " + DescribeLine(settings) + ": " + ErrorText(errno);
+    *why = "the device refuses " + DescribeLine(settings) + ": " + SystemErrorText(errno);
     return false;
   }
   AddLineOptions(options_, &line);
   if (!SetLine(line)) {
-    *why = "the device refuses " + DescribeLine(settings) + ": " + ErrorText(errno);
+    *why = "the device refuses " + DescribeLine(settings) + ": " + SystemErrorText(errno);
     return false;
   }
   return ApplyDirection(settings.mode, why, note);
@@ -228,7 +227,7 @@ bool SerialDevice::ApplyDirection(int mode, std::string* why, std::string* note)
   if (policy == PortOptions::Rs485::kRts) {
     if (needsRts_ && !SetRts(false)) {
       needsRts_ = false;
-      *why = "rs485=rts: the line cannot switch RTS: " + ErrorText(errno);
+      *why = "rs485=rts: the line cannot switch RTS: " + SystemErrorText(errno);
       return false;
     }
     return true;
@@ -245,7 +244,7 @@ bool SerialDevice::ApplyDirection(int mode, std::string* why, std::string* note)
   }
   *why = outcome == Rs485Outcome::kNotSupported
              ? "rs485=ioctl: the kernel cannot control the RS-485 direction of this port"
-             : "the device refuses RS-485: " + ErrorText(errno);
+             : "the device refuses RS-485: " + SystemErrorText(errno);
   return false;
 }
 

@@ -19,7 +19,7 @@ namespace {
 
 constexpr std::size_t kChunkBytes = 4096;
 constexpr std::size_t kPathBytes = 64;
-constexpr int kDrainStepMs = 5;
+constexpr int kOutDrainStepMs = 5;
 constexpr int kUnseenDrainMs = 1000;
 constexpr int kHostEndFlags = O_RDWR | O_NOCTTY | O_CLOEXEC | O_NONBLOCK;
 
@@ -120,6 +120,6 @@ void DevicePort::Drain(const Deadline& deadline) const {
     if (unread ? *unread == 0 : unseen.HasPassed()) {
       return;
     }
-    Deadline::After(kDrainStepMs).Sleep();
+    Deadline::After(kOutDrainStepMs).Sleep();
   }
 }

@@ -6,14 +6,14 @@
 
 namespace {
 
-constexpr std::uint64_t kStream = 0x6A06E;
+constexpr std::uint64_t kGaugeStream = 0x6A06E;
 constexpr int kMeanUm = 12345;
 constexpr int kSpreadUm = 10;
 
 }  // namespace
 
 GaugeDevice::GaugeDevice(const DeviceSettings& settings)
-    : CommandDevice(settings), random_(settings.seed, kStream) {}
+    : CommandDevice(settings), random_(settings.seed, kGaugeStream) {}
 
 std::string GaugeDevice::NextBody() {
   const int um = kMeanUm - kSpreadUm + static_cast<int>(random_.Below(2 * kSpreadUm + 1));

@@ -6,7 +6,7 @@
 
 namespace {
 
-constexpr std::uint64_t kStream = 0xCA4D;
+constexpr std::uint64_t kRfidStream = 0xCA4D;
 constexpr std::size_t kNumberBytes = 5;
 constexpr std::array<std::size_t, 6> kOrder = {0, 0, 1, 2, 3, 1};
 
@@ -25,7 +25,7 @@ std::string MakeCard(SimRandom* random) {
 }  // namespace
 
 RfidDevice::RfidDevice(const DeviceSettings& settings) : CommandDevice(settings) {
-  SimRandom random(settings.seed, kStream);
+  SimRandom random(settings.seed, kRfidStream);
   for (std::string& card : cards_) {
     card = MakeCard(&random);
   }

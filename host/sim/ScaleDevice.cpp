@@ -8,13 +8,13 @@
 
 namespace {
 
-constexpr std::uint64_t kStream = 0x5CA1E;
+constexpr std::uint64_t kScaleStream = 0x5CA1E;
 constexpr int kMaxLoadGrams = 150000;
 
 }  // namespace
 
 ScaleDevice::ScaleDevice(const DeviceSettings& settings)
-    : CommandDevice(settings), random_(settings.seed, kStream) {}
+    : CommandDevice(settings), random_(settings.seed, kScaleStream) {}
 
 std::string ScaleDevice::NextBody() {
   const int drift = Settings().driftGrams;

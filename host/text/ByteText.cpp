@@ -10,10 +10,10 @@ constexpr std::string_view kLowerDigits = "0123456789abcdef";
 
 // The letter that C writes behind a backslash for this byte, or 0.
 char CLetter(unsigned char byte) {
-  constexpr std::string_view kBytes = "\a\b\f\n\r\t\v\\\"";
-  constexpr std::string_view kLetters = "abfnrtv\\\"";
-  const std::size_t position = kBytes.find(static_cast<char>(byte));
-  return position == std::string_view::npos ? '\0' : kLetters[position];
+  constexpr std::string_view kEscapedBytes = "\a\b\f\n\r\t\v\\\"";
+  constexpr std::string_view kEscapeLetters = "abfnrtv\\\"";
+  const std::size_t position = kEscapedBytes.find(static_cast<char>(byte));
+  return position == std::string_view::npos ? '\0' : kEscapeLetters[position];
 }
 
 void AppendEscaped(unsigned char byte, std::string* text) {

@@ -13,14 +13,14 @@ namespace {
 
 std::atomic<long long> living{0};
 
-thread_local long long allocations = 0;
+thread_local long long allocationCount = 0;
 thread_local int countdown = 0;  // 0: none fails
 thread_local bool failsFromThenOn = false;
 thread_local bool failed = false;
 
 bool IsToFail() {
   if (HostCall::IsInside()) return false;
-  ++allocations;
+  ++allocationCount;
   if (countdown == 0 || --countdown != 0) {
     return false;
   }
@@ -64,7 +64,7 @@ FailingNew::~FailingNew() { countdown = 0; }
 
 bool FailingNew::HasFailed() const { return failed; }
 
-long long FailingNew::Count() { return allocations; }
+long long FailingNew::Count() { return allocationCount; }
 
 long long FailingNew::Living() { return living; }
 

@@ -1,6 +1,8 @@
 // SPDX-License-Identifier: Apache-2.0
 #pragma once
 
+#include <gtest/gtest.h>
+
 #include <cstring>
 #include <memory>
 #include <string>
@@ -70,3 +72,9 @@ class FakeDriver : public ProtocolBase {
   int readResult = 1;
   int writeResult = 1;
 };
+
+// What the driver reports last.
+inline void ExpectError(const IProtocol& driver, int code, const char* text) {
+  EXPECT_EQ(driver.GetLastError(), code);
+  EXPECT_STREQ(driver.GetLastErrorString(), text);
+}

@@ -2,14 +2,10 @@
 #include <gtest/gtest.h>
 
 #include "tests/host/commands/InstanceRun.h"
+#include "tests/host/support/TestLimit.h"
+#include "tests/host/support/TextParts.h"
 
 namespace {
-
-constexpr int kLimitMs = 20000;
-
-bool Holds(const std::string& text, const std::string& part) {
-  return text.find(part) != std::string::npos;
-}
 
 TEST(CmdAttached, ReachesTheRunningDriver) {
   InstanceRun instance("rx_suffix=03 tx_suffix=0D");

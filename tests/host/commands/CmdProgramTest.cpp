@@ -6,16 +6,12 @@
 #include "host/store/SqliteStorage.h"
 #include "tests/host/support/PluginConfiguration.h"
 #include "tests/host/support/ProgramRun.h"
+#include "tests/host/support/TestLimit.h"
+#include "tests/host/support/TextParts.h"
 
 namespace {
 
-constexpr int kLimitMs = 20000;
-
 using Words = std::vector<std::string>;
-
-bool Holds(const std::string& text, const std::string& part) {
-  return text.find(part) != std::string::npos;
-}
 
 // A command on a port that is given in front of the options.
 Words OnPort(const std::string& port, const Words& words, const std::string& more = "") {

@@ -8,6 +8,7 @@
 #include <nlohmann/json.hpp>
 
 #include "tests/host/commands/InstanceRun.h"
+#include "tests/host/support/TextParts.h"
 
 namespace {
 
@@ -15,12 +16,6 @@ using Json = nlohmann::json;
 using Words = std::vector<std::string>;
 
 constexpr int kPauseMs = 60;
-
-Deadline Limit() { return Deadline::After(ProgramRun::kLimitMs); }
-
-bool Holds(const std::string& text, const std::string& part) {
-  return text.find(part) != std::string::npos;
-}
 
 Words Sub(const PseudoTerminal& line, const std::string& more, const Words& options) {
   Words words = {"sub",         line.Path(), "--config", TestConfiguration(more),
@@ -35,7 +30,7 @@ TEST(Complaints, ALineThatArrivesInPiecesIsOneToken) {
   ProgramRun run(Sub(line, "rx_suffix=0D0A gap=20000", {"-C", "1"}));
   ASSERT_TRUE(run.AwaitErrors("queue 100")) << run.Errors();
   for (const char* const piece : {"ST,GS", "+  5.1", "2kg\r", "\n"}) {
-    ASSERT_TRUE(line.Send(piece, Limit()));
+    ASSERT_TRUE(line.Send(piece, ProgramRun::Limit()));
     Deadline::After(kPauseMs).Sleep();
   }
   EXPECT_EQ(run.Output(), "ST,GS+  5.12kg\n");
@@ -46,7 +41,7 @@ TEST(Complaints, TheGapThatEndsALineWithASuffixIsNamedWithTheOptionThatHelps) {
   const PseudoTerminal line;
   ProgramRun run(Sub(line, "rx_suffix=0D", {"-C", "1"}));
   ASSERT_TRUE(run.AwaitErrors("queue 100")) << run.Errors();
-  ASSERT_TRUE(line.Send("AB", Limit()));
+  ASSERT_TRUE(line.Send("AB", ProgramRun::Limit()));
   EXPECT_TRUE(run.AwaitErrors("drop no-suffix after 500 ms: 41 42")) << run.Errors();
   EXPECT_TRUE(run.AwaitErrors("a longer --gap allows")) << run.Errors();
 }
@@ -67,7 +62,7 @@ TEST_P(DropComplaints, EveryLostByteHasItsReason) {
   ASSERT_TRUE(instance.IsReady()) << instance.Errors();
   const auto sub = instance.Begin({"sub"});
   ASSERT_TRUE(sub->AwaitErrors("attached")) << sub->Errors();
-  ASSERT_TRUE(instance.Line().Send(entry.bytes, Limit()));
+  ASSERT_TRUE(instance.Line().Send(entry.bytes, ProgramRun::Limit()));
   EXPECT_TRUE(sub->AwaitErrors(std::string("drop ") + entry.reason)) << sub->Errors();
   EXPECT_TRUE(sub->AwaitErrors(entry.hint)) << sub->Errors();
   const Json stats = Json::parse(instance.Output({"stats", "-j"}));
@@ -90,8 +85,8 @@ TEST(Complaints, AQueueOfOneHoldsTheNewestValueAndTheOthersAreCounted) {
   InstanceRun instance("rx_suffix=03 token_queue_size=1");
   ASSERT_TRUE(instance.IsReady()) << instance.Errors();
   ASSERT_TRUE(instance.DeviceSends("1\x03", "1"));
-  ASSERT_TRUE(instance.Line().Send("2\x03\x33\x03", Limit()));
-  const Deadline deadline = Limit();
+  ASSERT_TRUE(instance.Line().Send("2\x03\x33\x03", ProgramRun::Limit()));
+  const Deadline deadline = ProgramRun::Limit();
   std::string value;
   while (value != "3\n" && !deadline.HasPassed()) {
     value = instance.Output({"read", "0?rx_token?string-16"});
@@ -108,7 +103,7 @@ TEST(Complaints, AQueueOfOneIsWatchedWithoutTakingTokens) {
   const PseudoTerminal line;
   ProgramRun run(Sub(line, "rx_suffix=03 token_queue_size=1", {"--peek", "-q", "-C", "3"}));
   for (const char* const token : {"1\x03", "2\x03", "3\x03"}) {
-    ASSERT_TRUE(line.Send(token, Limit()));
+    ASSERT_TRUE(line.Send(token, ProgramRun::Limit()));
     EXPECT_EQ(run.Line(), std::string(1, token[0]));
   }
   EXPECT_EQ(run.Status(), 0);
@@ -117,7 +112,7 @@ TEST(Complaints, AQueueOfOneIsWatchedWithoutTakingTokens) {
 // "It missed a scan": two equal codes, one behind the other, are two tokens.
 TEST(Complaints, EqualTokensAreTakenOneByOne) {
   const PseudoTerminal line;
-  ASSERT_TRUE(line.Send("4006381333931\r4006381333931\r", Limit()));
+  ASSERT_TRUE(line.Send("4006381333931\r4006381333931\r", ProgramRun::Limit()));
   ProgramRun run(Sub(line, "rx_suffix=0D", {"-C", "2", "-F", "%n %p"}));
   EXPECT_EQ(run.Output(), "1 4006381333931\n2 4006381333931\n");
 }
@@ -158,7 +153,7 @@ TEST(Complaints, AnotherPortIsNeverTheRunningInstance) {
   EXPECT_EQ(instance.Loka({"send", "com2=" + other.Path(), "--tx-suffix", "03", "-m", "R"}).status,
             0);
   std::string sent;
-  EXPECT_TRUE(other.Receive(2, Limit(), &sent));
+  EXPECT_TRUE(other.Receive(2, ProgramRun::Limit(), &sent));
   EXPECT_EQ(sent, "R\x03");
   const InstanceRun::Result none = instance.Loka({"stats", "--instance", "com7"});
   EXPECT_EQ(none.status, 5);
@@ -176,13 +171,13 @@ TEST(Complaints, ARunningInstanceSaysOnlyWhatItIsAskedFor) {
   ASSERT_TRUE(run.AwaitErrors("commands attach at")) << run.Errors();
   ProgramRun sub({"sub", "-C", "1"}, environment);
   ASSERT_TRUE(sub.AwaitErrors("attached")) << sub.Errors();
-  ASSERT_TRUE(line.Send("A\x03", Limit()));
+  ASSERT_TRUE(line.Send("A\x03", ProgramRun::Limit()));
   EXPECT_EQ(sub.Output(), "A\n");
   run.Signal(SIGTERM);
   EXPECT_EQ(run.Status(), 128 + SIGTERM);
   EXPECT_FALSE(Holds(run.Errors(), "body")) << run.Errors();
   ProgramRun quiet({"run", line.Path(), "--no-store", "-q"}, environment);
-  const Deadline deadline = Limit();
+  const Deadline deadline = ProgramRun::Limit();
   int status = -1;
   while (status != 0 && !deadline.HasPassed()) {  // it says nothing when it is ready
     ProgramRun stats({"stats", "-j"}, environment);
@@ -206,9 +201,9 @@ TEST(Complaints, LinesAndFilesToSendAreTakenAsPeopleMeanThem) {
                       "exec \"$0\" " + send + "-l -q <'" + folder.File("lines") + "' --plugin '" +
                           PluginLibrary::DefaultPath() + "' 2>/dev/null",
                       LOKA_PROGRAM_PATH});
-  EXPECT_EQ(lines.Wait(Limit()), 0);
+  EXPECT_EQ(lines.Wait(ProgramRun::Limit()), 0);
   std::string sent;
-  EXPECT_TRUE(line.Receive(4, Limit(), &sent));
+  EXPECT_TRUE(line.Receive(4, ProgramRun::Limit(), &sent));
   EXPECT_EQ(sent, "a\rb\r");
   ProgramRun run({"send", line.Path(), "-f", folder.Path().string()});
   EXPECT_EQ(run.Status(), 2);
@@ -222,7 +217,7 @@ TEST(Complaints, AResultThatHasNotGoneOutIsNoSuccess) {
     ChildProcess process(
         "/bin/sh", {"sh", "-c", std::string("exec \"$0\" ") + command + " >/dev/full 2>/dev/null",
                     LOKA_PROGRAM_PATH});
-    EXPECT_EQ(process.Wait(Limit()), 1) << command;
+    EXPECT_EQ(process.Wait(ProgramRun::Limit()), 1) << command;
   }
 }
 

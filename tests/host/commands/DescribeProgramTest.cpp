@@ -11,14 +11,11 @@
 #include "host/text/Utf8Text.h"
 #include "tests/host/document/FakeLibrary.h"
 #include "tests/host/support/ProgramRun.h"
+#include "tests/host/support/TextParts.h"
 
 namespace {
 
 using Json = nlohmann::json;
-
-bool Holds(const std::string& text, const std::string& part) {
-  return text.find(part) != std::string::npos;
-}
 
 // What a run prints; it must succeed without a word on stderr.
 std::string Result(const std::vector<std::string>& arguments) {

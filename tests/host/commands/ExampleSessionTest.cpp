@@ -9,15 +9,12 @@
 #include <regex>
 
 #include "tests/host/support/ProgramRun.h"
+#include "tests/host/support/TextParts.h"
 
 namespace {
 
 using Json = nlohmann::json;
 using Words = std::vector<std::string>;
-
-bool Holds(const std::string& text, const std::string& part) {
-  return text.find(part) != std::string::npos;
-}
 
 struct Result {
   int status = -1;

@@ -9,10 +9,10 @@
 #include "host/store/SqliteStorage.h"
 #include "tests/host/support/PluginConfiguration.h"
 #include "tests/host/support/ProgramRun.h"
+#include "tests/host/support/TestLimit.h"
+#include "tests/host/support/TextParts.h"
 
 namespace {
-
-constexpr int kLimitMs = 20000;
 
 std::vector<std::string> SubArguments(const std::string& port, const std::string& more) {
   return {"sub",
@@ -22,10 +22,6 @@ std::vector<std::string> SubArguments(const std::string& port, const std::string
           port,
           "--config",
           TestConfiguration("gap=50 " + more)};
-}
-
-bool Holds(const std::string& text, const std::string& part) {
-  return text.find(part) != std::string::npos;
 }
 
 TEST(Program, HelpFitsOneScreen) {

@@ -4,14 +4,11 @@
 #include <nlohmann/json.hpp>
 
 #include "tests/host/commands/InstanceRun.h"
+#include "tests/host/support/TextParts.h"
 
 namespace {
 
 using Json = nlohmann::json;
-
-bool Holds(const std::string& text, const std::string& part) {
-  return text.find(part) != std::string::npos;
-}
 
 TEST(SetCommand, StagesThenAppliesAndStores) {
   InstanceRun instance("baudrate=9600 rx_suffix=03");

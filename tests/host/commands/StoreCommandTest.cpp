@@ -5,14 +5,11 @@
 #include <fstream>
 
 #include "tests/host/commands/InstanceRun.h"
+#include "tests/host/support/TextParts.h"
 
 namespace {
 
 constexpr const char* kKeeps = "the running driver keeps its cached values until it is restarted";
-
-bool Holds(const std::string& text, const std::string& part) {
-  return text.find(part) != std::string::npos;
-}
 
 void WriteFile(const std::string& path, const std::string& text) {
   std::ofstream file(path, std::ios::binary);

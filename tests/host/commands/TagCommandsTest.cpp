@@ -5,17 +5,14 @@
 #include <sstream>
 
 #include "tests/host/commands/InstanceRun.h"
+#include "tests/host/support/TestLimit.h"
+#include "tests/host/support/TextParts.h"
 
 namespace {
 
 using Json = nlohmann::json;
 
-constexpr int kLimitMs = 20000;
 constexpr const char* kBaudUri = "0?SP_Baud?unsignedInt";
-
-bool Holds(const std::string& text, const std::string& part) {
-  return text.find(part) != std::string::npos;
-}
 
 std::vector<Json> JsonLines(const std::string& text) {
   std::vector<Json> lines;

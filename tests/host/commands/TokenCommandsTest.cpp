@@ -7,16 +7,11 @@
 #include <thread>
 
 #include "tests/host/commands/InstanceRun.h"
+#include "tests/host/support/TextParts.h"
 
 namespace {
 
 using Json = nlohmann::json;
-
-Deadline Limit() { return Deadline::After(ProgramRun::kLimitMs); }
-
-bool Holds(const std::string& text, const std::string& part) {
-  return text.find(part) != std::string::npos;
-}
 
 std::vector<std::string> With(std::vector<std::string> arguments, const std::string& port,
                               const std::string& more) {
@@ -32,7 +27,7 @@ TEST(SubCommand, PrintsTokensAndEndsAtTheCount) {
                 "A\x1B\x03\x02"
                 "B\x03\x02"
                 "C\x03",
-                Limit()));
+                ProgramRun::Limit()));
   ProgramRun run(With({"sub", "-C", "2"}, line.Path(), "rx_prefix=02 rx_suffix=03"));
   EXPECT_EQ(run.Output(), "A\\x1b\nB\n");
   EXPECT_EQ(run.Status(), 0);
@@ -49,7 +44,7 @@ TEST(SubCommand, ShowsFramesHexAndFormats) {
     ASSERT_TRUE(
         line.Send("\x02"
                   "A\x03",
-                  Limit()));
+                  ProgramRun::Limit()));
     ProgramRun run(With(arguments, line.Path(), "rx_prefix=02 rx_suffix=03"));
     EXPECT_EQ(run.Output(), output);
     EXPECT_EQ(run.Status(), 0);
@@ -62,7 +57,7 @@ TEST(SubCommand, SaysTheRoleOfEachByte) {
   ASSERT_TRUE(
       line.Send("x\x02"
                 "AB\x03",
-                Limit()));
+                ProgramRun::Limit()));
   ProgramRun run(With({"sub", "-C", "1", "-vv"}, line.Path(), "rx_prefix=02 rx_suffix=03"));
   EXPECT_EQ(run.Output(), "AB\n");
   EXPECT_TRUE(Holds(run.Errors(), "loka: drop no-prefix: 78")) << run.Errors();
@@ -74,7 +69,7 @@ TEST(SubCommand, ColoursWhereTheyAreAskedFor) {
   ASSERT_TRUE(
       line.Send("x\x02"
                 "A\x03",
-                Limit()));
+                ProgramRun::Limit()));
   ProgramRun run(With({"sub", "-C", "1", "-X", "--color", "always"}, line.Path(),
                       "rx_prefix=02 rx_suffix=03"));
   EXPECT_EQ(run.Output(),
@@ -93,23 +88,23 @@ TEST(SubCommand, WithoutReconnectTheLossOfTheLineIsStatus6) {
 
 TEST(SubCommand, SaysWhatWasDroppedAndWhatHelps) {
   PseudoTerminal line;
-  ASSERT_TRUE(line.Send("ST,", Limit()));
+  ASSERT_TRUE(line.Send("ST,", ProgramRun::Limit()));
   ProgramRun run(With({"sub", "-C", "1"}, line.Path(), "rx_suffix=03 gap=60"));
   ASSERT_TRUE(run.AwaitErrors("drop no-suffix after 60 ms: 53 54 2C  \"ST,\"")) << run.Errors();
-  ASSERT_TRUE(line.Send("A\x03", Limit()));
+  ASSERT_TRUE(line.Send("A\x03", ProgramRun::Limit()));
   EXPECT_EQ(run.Output(), "A\n");
 }
 
 TEST(SubCommand, WritesOneObjectALine) {
   PseudoTerminal line;
-  ASSERT_TRUE(line.Send("ST,", Limit()));
+  ASSERT_TRUE(line.Send("ST,", ProgramRun::Limit()));
   ProgramRun run(With({"sub", "-j", "-C", "1"}, line.Path(), "rx_suffix=03 gap=60"));
   const Json drop = Json::parse(run.Line(), nullptr, false);
   EXPECT_EQ(drop.value("ev", ""), "drop") << drop;
   EXPECT_EQ(drop.value("why", ""), "no-suffix");
   EXPECT_EQ(drop.value("after_ms", 0), 60);
   EXPECT_EQ(drop.value("hex", ""), "53542C");
-  ASSERT_TRUE(line.Send(std::string("\xFF\x1B\x03", 3), Limit()));
+  ASSERT_TRUE(line.Send(std::string("\xFF\x1B\x03", 3), ProgramRun::Limit()));
   const Json token = Json::parse(run.Line(), nullptr, false);
   EXPECT_EQ(token.value("ev", ""), "token") << token;
   EXPECT_EQ(token.value("hex", ""), "FF1B");
@@ -134,7 +129,7 @@ TEST(SubCommand, RefusesAFormatItDoesNotKnow) {
 
 TEST(SubCommand, SaysThatAPlainTokenEndsAtItsZeroByte) {
   PseudoTerminal line;
-  ASSERT_TRUE(line.Send(std::string("A\0B\x03", 4), Limit()));
+  ASSERT_TRUE(line.Send(std::string("A\0B\x03", 4), ProgramRun::Limit()));
   ProgramRun run(With({"sub", "-C", "1"}, line.Path(), "rx_suffix=03"));
   EXPECT_EQ(run.Output(), "A\n");
   EXPECT_TRUE(Holds(run.Errors(), "3 bytes and a zero byte behind the first 1")) << run.Errors();
@@ -165,7 +160,7 @@ TEST(SubCommand, BesideAnInstanceThatTakesTokensEveryListenerGetsThem) {
   std::atomic<bool> isEnough{false};
   std::thread device([&] {
     while (!isEnough.load()) {
-      EXPECT_TRUE(instance.Line().Send("A\x03", Limit()));
+      EXPECT_TRUE(instance.Line().Send("A\x03", ProgramRun::Limit()));
       Deadline::After(20).Sleep();
     }
   });
@@ -182,7 +177,7 @@ TEST(SendCommand, FramesAndSends) {
   EXPECT_EQ(instance.Loka({"send", "-m", "CD"}).status, 0);
   EXPECT_EQ(instance.Loka({"send", "-x", "1B CR LF"}).status, 0);
   std::string bytes;
-  ASSERT_TRUE(instance.Line().Receive(9, Limit(), &bytes));
+  ASSERT_TRUE(instance.Line().Receive(9, ProgramRun::Limit(), &bytes));
   EXPECT_EQ(bytes,
             "\x02"
             "CD\x03\x02\x1B\r\n\x03");
@@ -196,9 +191,9 @@ TEST(AskCommand, PrintsTheNextToken) {
   ASSERT_TRUE(instance.IsReady()) << instance.Errors();
   const auto ask = instance.Begin({"ask", "-q", "-m", "R", "-W", "20"});
   std::string bytes;
-  ASSERT_TRUE(instance.Line().Receive(2, Limit(), &bytes));
+  ASSERT_TRUE(instance.Line().Receive(2, ProgramRun::Limit(), &bytes));
   EXPECT_EQ(bytes, "R\r");
-  ASSERT_TRUE(instance.Line().Send("5.12kg\x03", Limit()));
+  ASSERT_TRUE(instance.Line().Send("5.12kg\x03", ProgramRun::Limit()));
   EXPECT_EQ(ask->Output(), "5.12kg\n");
   EXPECT_EQ(ask->Status(), 0);
   EXPECT_EQ(instance.Loka({"ask", "-m", "X", "-W", "0.3"}).status, 27);
@@ -211,7 +206,7 @@ TEST(StatsCommand, CountsTokensAndDrops) {
       instance.Line().Send("A\x03"
                            "B\x03"
                            "C",
-                           Limit()));
+                           ProgramRun::Limit()));
   const Deadline deadline = Deadline::After(ProgramRun::kLimitMs);
   Json counts = Json::object();
   while (counts.value("tokens", 0) < 2 || counts.value("dropped_bytes", 0) < 1) {

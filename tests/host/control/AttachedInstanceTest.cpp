@@ -8,12 +8,11 @@
 #include "host/control/ControlServer.h"
 #include "host/events/EventSink.h"
 #include "tests/host/control/ControlFolder.h"
+#include "tests/host/support/TestLimit.h"
 
 namespace {
 
 using Json = nlohmann::json;
-
-constexpr int kLimitMs = 20000;
 
 class NoteLog final : public EventSink {
  public:
@@ -25,7 +24,7 @@ class NoteLog final : public EventSink {
   std::vector<std::string> texts;
 };
 
-HostEvent Note(const std::string& text) { return {0, "com3", NoteMade{text}}; }
+HostEvent NoteOfInstance(const std::string& text) { return {0, "com3", NoteMade{text}}; }
 
 class AttachedInstanceTest : public testing::Test {
  protected:
@@ -44,7 +43,7 @@ class AttachedInstanceTest : public testing::Test {
     }
     if (request["op"] == "something") {
       // An event in front of the answer: the client keeps it.
-      server_->OnEvent(Note("during something"));
+      server_->OnEvent(NoteOfInstance("during something"));
     }
     Answer answer;
     answer.data = info_;
@@ -97,7 +96,7 @@ TEST_F(AttachedInstanceTest, ServesEventsAlsoThoseThatCameBetween) {
   ASSERT_NE(instance, nullptr) << error_;
   ASSERT_TRUE(instance->Subscribe().IsDone());
   EXPECT_TRUE(instance->Call({{"op", "something"}}).IsDone());
-  server_->OnEvent(Note("later"));
+  server_->OnEvent(NoteOfInstance("later"));
   NoteLog log;
   const Answer served = instance->Serve(
       &log, [&] { return log.texts.size() >= 2; }, Deadline::After(kLimitMs));

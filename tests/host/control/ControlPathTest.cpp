@@ -7,14 +7,9 @@
 
 #include "host/control/ControlPath.h"
 #include "tests/host/control/ControlFolder.h"
+#include "tests/host/support/FileMode.h"
 
 namespace {
-
-unsigned int ModeOf(const std::string& path) {
-  struct stat status {};
-  EXPECT_EQ(stat(path.c_str(), &status), 0) << path;
-  return status.st_mode & 07777U;
-}
 
 TEST(ControlPath, FollowsTheEnvironment) {
   (void)setenv("XDG_RUNTIME_DIR", "/run/user/7", 1);

@@ -10,18 +10,13 @@
 #include "host/events/EventJson.h"
 #include "tests/host/control/ControlClient.h"
 #include "tests/host/control/ControlFolder.h"
+#include "tests/host/support/FileMode.h"
 
 namespace {
 
 using Json = nlohmann::json;
 
-unsigned int ModeOf(const std::string& path) {
-  struct stat status {};
-  EXPECT_EQ(stat(path.c_str(), &status), 0) << path;
-  return status.st_mode & 07777U;
-}
-
-HostEvent Note(const std::string& text) { return {0, "com1", NoteMade{text}}; }
+HostEvent NoteOfServer(const std::string& text) { return {0, "com1", NoteMade{text}}; }
 
 class ControlServerTest : public testing::Test {
  protected:
@@ -123,8 +118,8 @@ TEST_F(ControlServerTest, SendsEventsToThoseWhoAskForThem) {
   ControlClient other(path_);
   EXPECT_EQ(listener.Ask("{\"op\":\"subscribe\",\"id\":7}")["id"], 7);
   EXPECT_EQ(other.Ask("{}")["ok"], true);
-  server->OnEvent(Note("one"));
-  EXPECT_EQ(listener.Line(), ToJsonLine(Note("one")));
+  server->OnEvent(NoteOfServer("one"));
+  EXPECT_EQ(listener.Line(), ToJsonLine(NoteOfServer("one")));
   EXPECT_EQ(other.Ask("{\"text\":\"mine\"}")["data"]["echo"], "mine");
 }
 
@@ -137,7 +132,7 @@ TEST_F(ControlServerTest, ClientThatDoesNotReadLosesEventsAndIsTold) {
   constexpr int kEvents = 4096;
   const std::string text(1024, 'x');
   for (int i = 0; i < kEvents; ++i) {
-    server->OnEvent(Note(text));
+    server->OnEvent(NoteOfServer(text));
   }
   // The instance goes on meanwhile.
   ControlClient other(path_);
@@ -152,7 +147,7 @@ TEST_F(ControlServerTest, ClientThatDoesNotReadLosesEventsAndIsTold) {
   EXPECT_LT(events, kEvents);
   EXPECT_GT(events, 100);
   EXPECT_EQ(line["ok"], true);
-  server->OnEvent(Note("behind"));
+  server->OnEvent(NoteOfServer("behind"));
   EXPECT_EQ(Json::parse(lazy.Line())["text"],
             std::to_string(kEvents - events) + " events were not read in time");
   EXPECT_EQ(Json::parse(lazy.Line())["text"], "behind");
@@ -186,7 +181,7 @@ TEST_F(ControlServerTest, ClientsThatGoAwayAreForgotten) {
   for (int i = 0; i < 300; ++i) {
     ControlClient client(path_);
     ASSERT_EQ(client.Ask("{\"op\":\"subscribe\"}")["ok"], true) << i;
-    server->OnEvent(Note("to nobody soon"));
+    server->OnEvent(NoteOfServer("to nobody soon"));
   }
 }
 

@@ -6,21 +6,18 @@
 #include "host/document/DescriptionBlock.h"
 #include "tests/host/document/FakeLibrary.h"
 #include "tests/host/support/TemporaryFolder.h"
+#include "tests/host/support/TextParts.h"
 
 namespace {
 
 const std::string kZero(1, '\0');
 
-std::string ErrorOf(const std::string& bytes) {
+std::string BlockErrorOf(const std::string& bytes) {
   DescriptionBlock block;
   std::string error;
   EXPECT_FALSE(FindDescription(bytes, &block, &error));
   EXPECT_EQ(block.xml, "");
   return error;
-}
-
-bool Holds(const std::string& text, const std::string& part) {
-  return text.find(part) != std::string::npos;
 }
 
 TEST(DescriptionBlock, IsFoundAmongOtherBytes) {
@@ -61,37 +58,40 @@ TEST(DescriptionBlock, MarkersWithoutABlockArePassedOver) {
 }
 
 TEST(DescriptionBlock, SaysWhatIsMissing) {
-  EXPECT_TRUE(Holds(ErrorOf(""), "expected a driver library with the marker"));
-  EXPECT_TRUE(Holds(ErrorOf("some text"), "expected a driver library with the marker"));
-  EXPECT_TRUE(Holds(ErrorOf("<<VADO_XML_START>>Name=A"), "identification line does not end"));
-  EXPECT_TRUE(Holds(ErrorOf("<<VADO_XML_START>>" + std::string(5000, 'x')), "identification line"));
+  EXPECT_TRUE(Holds(BlockErrorOf(""), "expected a driver library with the marker"));
+  EXPECT_TRUE(Holds(BlockErrorOf("some text"), "expected a driver library with the marker"));
+  EXPECT_TRUE(Holds(BlockErrorOf("<<VADO_XML_START>>Name=A"), "identification line does not end"));
+  EXPECT_TRUE(
+      Holds(BlockErrorOf("<<VADO_XML_START>>" + std::string(5000, 'x')), "identification line"));
   for (const char* line : {"", "Name=A", "Version=1", "Name=?Version=1", "Name=A?Version=x",
                            "Name=A?Version=-1", "Name=A?Version=99999999999"}) {
-    EXPECT_TRUE(Holds(ErrorOf(BlockOf(Compress("<x/>"), line)), "lacks Name= or a Version="))
+    EXPECT_TRUE(Holds(BlockErrorOf(BlockOf(Compress("<x/>"), line)), "lacks Name= or a Version="))
         << line;
   }
   const std::string start = std::string("<<VADO_XML_START>>") + kIdentification + kZero;
-  EXPECT_TRUE(Holds(ErrorOf(start + "compressedXML=5"), "length line does not end"));
+  EXPECT_TRUE(Holds(BlockErrorOf(start + "compressedXML=5"), "length line does not end"));
   for (const char* line :
        {"", "compressedXML", "compressedXML=", "compressedXML=0", "compressedXML=05",
         "compressedXML=-5", "compressedXML=+5", "compressedXML=5x", "compressedXML= 5", "5",
         "CompressedXML=5", "compressedXML=1048577", "compressedXML=99999999999999999999"}) {
-    EXPECT_TRUE(Holds(ErrorOf(start + line + kZero + "12345<<VADO_XML_END>>" + kZero),
+    EXPECT_TRUE(Holds(BlockErrorOf(start + line + kZero + "12345<<VADO_XML_END>>" + kZero),
                       "expected a length line \"compressedXML=\""))
         << line;
   }
-  EXPECT_TRUE(Holds(ErrorOf(start + "compressedXML=6" + kZero + "12345<<VADO_XML_END>>" + kZero),
+  EXPECT_TRUE(
+      Holds(BlockErrorOf(start + "compressedXML=6" + kZero + "12345<<VADO_XML_END>>" + kZero),
+            "expected the end marker"));
+  EXPECT_TRUE(Holds(BlockErrorOf(start + "compressedXML=1048576" + kZero + "12345"),
                     "expected the end marker"));
   EXPECT_TRUE(
-      Holds(ErrorOf(start + "compressedXML=1048576" + kZero + "12345"), "expected the end marker"));
-  EXPECT_TRUE(Holds(ErrorOf(start + "compressedXML=5" + kZero + "12345<<VADO_XML_END>>" + kZero),
-                    "no whole zlib stream"));
+      Holds(BlockErrorOf(start + "compressedXML=5" + kZero + "12345<<VADO_XML_END>>" + kZero),
+            "no whole zlib stream"));
 }
 
 TEST(DescriptionBlock, EveryTruncationIsRefused) {
   const std::string whole = BlockOf(Compress(SmallDocument()));
   for (std::size_t length = 0; length < whole.size(); ++length) {
-    EXPECT_NE(ErrorOf(whole.substr(0, length)), "") << length;
+    EXPECT_NE(BlockErrorOf(whole.substr(0, length)), "") << length;
   }
 }
 
@@ -122,9 +122,9 @@ TEST(DescriptionBlock, RandomBytesAreRefused) {
     for (int i = 0; i < 300; ++i) {
       bytes += static_cast<char>(static_cast<unsigned char>(random() & 0xFFU));
     }
-    EXPECT_NE(ErrorOf(bytes), "");
-    EXPECT_NE(ErrorOf("<<VADO_XML_START>>" + bytes), "");
-    EXPECT_NE(ErrorOf(BlockOf(bytes)), "");
+    EXPECT_NE(BlockErrorOf(bytes), "");
+    EXPECT_NE(BlockErrorOf("<<VADO_XML_START>>" + bytes), "");
+    EXPECT_NE(BlockErrorOf(BlockOf(bytes)), "");
   }
 }
 
@@ -134,7 +134,7 @@ TEST(DescriptionBlock, GivesUpAfterManyMarkers) {
   for (int i = 0; i < 64; ++i) {
     markers += "<<VADO_XML_START>>";
   }
-  EXPECT_NE(ErrorOf(markers + BlockOf(Compress("<x/>"))), "");
+  EXPECT_NE(BlockErrorOf(markers + BlockOf(Compress("<x/>"))), "");
   DescriptionBlock block;
   std::string error;
   EXPECT_TRUE(FindDescription(markers.substr(18) + BlockOf(Compress("<x/>")), &block, &error));

@@ -31,7 +31,7 @@ std::string Xml(const Parts& parts) {
          "</memtype_ref></model></models><conversions/></protocol_cfg>";
 }
 
-std::string ErrorOf(const std::string& xml) {
+std::string DocumentErrorOf(const std::string& xml) {
   DescriptionDocument document;
   document.models.resize(1);
   std::string error = "stale";
@@ -114,28 +114,28 @@ TEST(DescriptionDocument, ReadsTheDriversOwn) {
 }
 
 TEST(DescriptionDocument, OtherEncodingsAndFormsAreRefused) {
-  EXPECT_EQ(ErrorOf("<a>\xFF</a>"), "the document is no XML text in UTF-8");
-  EXPECT_EQ(ErrorOf("<a>\x01</a>"), "the document is no XML text in UTF-8");
-  EXPECT_EQ(ErrorOf(std::string("<a/>\0", 5)), "the document is no XML text in UTF-8");
+  EXPECT_EQ(DocumentErrorOf("<a>\xFF</a>"), "the document is no XML text in UTF-8");
+  EXPECT_EQ(DocumentErrorOf("<a>\x01</a>"), "the document is no XML text in UTF-8");
+  EXPECT_EQ(DocumentErrorOf(std::string("<a/>\0", 5)), "the document is no XML text in UTF-8");
   for (const char* xml : {"", "text", "<a>", "<a></b>", "<a b=c/>", "<a/><b/>"}) {
-    EXPECT_EQ(ErrorOf(xml).rfind("the document is no well-formed XML: ", 0), 0U) << xml;
+    EXPECT_EQ(DocumentErrorOf(xml).rfind("the document is no well-formed XML: ", 0), 0U) << xml;
   }
-  EXPECT_EQ(ErrorOf("<other/>"), "expected the root element protocol_cfg, found 'other'");
+  EXPECT_EQ(DocumentErrorOf("<other/>"), "expected the root element protocol_cfg, found 'other'");
 }
 
 TEST(DescriptionDocument, MissingSectionsAreNamed) {
   for (const char* section : {"parameters", "memtypes", "tag_uri", "models"}) {
     const std::string xml = Replaced(SmallDocument(), std::string("<") + section + "/>", "");
-    EXPECT_EQ(ErrorOf(xml), std::string("the element ") + section + " is missing");
+    EXPECT_EQ(DocumentErrorOf(xml), std::string("the element ") + section + " is missing");
   }
 }
 
 TEST(DescriptionDocument, WrongAttributesAreNamed) {
   const auto withParameter = [](const std::string& from, const std::string& to) {
-    return ErrorOf(Xml({Replaced(kParameter, from, to), ""}));
+    return DocumentErrorOf(Xml({Replaced(kParameter, from, to), ""}));
   };
   const auto withMemoryType = [](const std::string& from, const std::string& to) {
-    return ErrorOf(Xml({"", Replaced(kMemoryType, from, to)}));
+    return DocumentErrorOf(Xml({"", Replaced(kMemoryType, from, to)}));
   };
   EXPECT_EQ(withParameter("display=\"D\"", ""),
             "the element parameter 'key' lacks the attribute display");
@@ -157,7 +157,7 @@ TEST(DescriptionDocument, WrongAttributesAreNamed) {
 
 TEST(DescriptionDocument, ErrorsAreShortAndSafeForATerminal) {
   const std::string key = "&#27;[31m" + std::string(100000, 'k');
-  const std::string error = ErrorOf(Xml(
+  const std::string error = DocumentErrorOf(Xml(
       {Replaced(Replaced(kParameter, ">key<", ">" + key + "<"), "min=\"1\"", "min=\"a\""), ""}));
   EXPECT_EQ(error.rfind("the element parameter '\\x1B[31mkkk", 0), 0U) << error;
   EXPECT_LT(error.size(), 200U);
@@ -170,13 +170,13 @@ TEST(DescriptionDocument, DepthAndNumberOfElementsAreLimited) {
     open += "<a>";
     close += "</a>";
   }
-  EXPECT_EQ(ErrorOf("<protocol_cfg>" + open + close + "</protocol_cfg>"),
+  EXPECT_EQ(DocumentErrorOf("<protocol_cfg>" + open + close + "</protocol_cfg>"),
             "the document nests more than 32 elements");
   std::string many;
   for (int i = 0; i < 257; ++i) {
     many += "<p>1</p>";
   }
-  EXPECT_EQ(ErrorOf("<protocol_cfg>" + many + "</protocol_cfg>"),
+  EXPECT_EQ(DocumentErrorOf("<protocol_cfg>" + many + "</protocol_cfg>"),
             "the document has more than 256 properties");
 }
 

@@ -8,7 +8,7 @@ namespace {
 
 constexpr int kMaxBytes = 100000;
 
-std::string ErrorOf(const std::string& stream) {
+std::string InflateErrorOf(const std::string& stream) {
   std::string text = "untouched";
   std::string error;
   EXPECT_FALSE(Inflate(stream, kMaxBytes, &text, &error));
@@ -30,37 +30,38 @@ TEST(Inflate, TakesExactlyTheLimit) {
   std::string text;
   std::string error;
   EXPECT_TRUE(Inflate(Compress(std::string(kMaxBytes, 'x')), kMaxBytes, &text, &error));
-  EXPECT_EQ(ErrorOf(Compress(std::string(kMaxBytes + 1, 'x'))),
+  EXPECT_EQ(InflateErrorOf(Compress(std::string(kMaxBytes + 1, 'x'))),
             "the document inflates to more than 100000 bytes");
 }
 
 TEST(Inflate, StopsAtTheLimitOfALongStream) {
   // 20 MB of zeros in 20 KB.
   const std::string bomb = Compress(std::string(20UL * 1000 * 1000, '\0'));
-  EXPECT_EQ(ErrorOf(bomb), "the document inflates to more than 100000 bytes");
+  EXPECT_EQ(InflateErrorOf(bomb), "the document inflates to more than 100000 bytes");
 }
 
 TEST(Inflate, RefusesEveryTruncation) {
   const std::string stream = Compress("a text that is long enough to have some parts");
   for (std::size_t length = 0; length < stream.size(); ++length) {
-    EXPECT_EQ(ErrorOf(stream.substr(0, length)), "the compressed document ends early") << length;
+    EXPECT_EQ(InflateErrorOf(stream.substr(0, length)), "the compressed document ends early")
+        << length;
   }
 }
 
 TEST(Inflate, RefusesWhatFollows) {
-  EXPECT_EQ(ErrorOf(Compress("text") + "abc"),
+  EXPECT_EQ(InflateErrorOf(Compress("text") + "abc"),
             "the compressed document ends 3 bytes before its stated length");
 }
 
 TEST(Inflate, RefusesDamage) {
   std::string stream = Compress("text");
   stream.back() = static_cast<char>(stream.back() ^ 1);
-  EXPECT_EQ(ErrorOf(stream), "the compressed document is no whole zlib stream");
-  EXPECT_EQ(ErrorOf("plain text"), "the compressed document is no whole zlib stream");
+  EXPECT_EQ(InflateErrorOf(stream), "the compressed document is no whole zlib stream");
+  EXPECT_EQ(InflateErrorOf("plain text"), "the compressed document is no whole zlib stream");
   // A stream that needs a dictionary.
-  EXPECT_EQ(ErrorOf(std::string("\x78\xBB\x01\x02\x03\x04"
-                                "abcdef",
-                                12)),
+  EXPECT_EQ(InflateErrorOf(std::string("\x78\xBB\x01\x02\x03\x04"
+                                       "abcdef",
+                                       12)),
             "the compressed document is no whole zlib stream");
 }
 

@@ -11,7 +11,7 @@ namespace {
 // 2026-11-21 09:12:03.123456 UTC.
 constexpr std::int64_t kTimeUs = 1795252323123456;
 
-HostEvent Event(HostEvent::Detail detail) { return {kTimeUs, "com1", std::move(detail)}; }
+HostEvent EventAtTime(HostEvent::Detail detail) { return {kTimeUs, "com1", std::move(detail)}; }
 
 struct Case {
   const char* name;
@@ -22,34 +22,35 @@ struct Case {
 std::vector<Case> Cases() {
   return {
       {"Received",
-       Event(BytesReceived{"\x02"
-                           "A\x03"}),
+       EventAtTime(BytesReceived{"\x02"
+                                 "A\x03"}),
        R"("ev":"rx","port":"com1","hex":"024103"})"},
-      {"Sent", Event(BytesSent{"AB", 1}), R"("ev":"tx","port":"com1","hex":"4142","sent":1})"},
-      {"Label", Event(BytesLabelled{"suffix", "\x03"}),
+      {"Sent", EventAtTime(BytesSent{"AB", 1}),
+       R"("ev":"tx","port":"com1","hex":"4142","sent":1})"},
+      {"Label", EventAtTime(BytesLabelled{"suffix", "\x03"}),
        R"("ev":"label","port":"com1","role":"suffix","hex":"03"})"},
-      {"Token", Event(TokenReceived{17, "ST,GS+5.1", 9, 1, 9375, false, ""}),
+      {"Token", EventAtTime(TokenReceived{17, "ST,GS+5.1", 9, 1, 9375, false, ""}),
        R"("ev":"token","port":"com1","n":17,"len":9,"text":"ST,GS+5.1","hex":"53542C47532B352E31","waiting":1,"dur_us":9375})"},
       {"CutToken",
-       Event(TokenReceived{1, "A", 3, 2, -1, true,
-                           "\x02"
-                           "A",
-                           1, 0}),
+       EventAtTime(TokenReceived{1, "A", 3, 2, -1, true,
+                                 "\x02"
+                                 "A",
+                                 1, 0}),
        R"("ev":"token","port":"com1","n":1,"len":3,"text":"A","hex":"41","waiting":2,"cut":true,"frame":"0241","prefix_len":1,"suffix_len":0})"},
-      {"Drop", Event(BytesDropped{"no-suffix", "ST,", 500}),
+      {"Drop", EventAtTime(BytesDropped{"no-suffix", "ST,", 500}),
        R"("ev":"drop","port":"com1","why":"no-suffix","after_ms":500,"hex":"53542C"})"},
-      {"DropWithoutSilence", Event(BytesDropped{"over-1000", "A", 0}),
+      {"DropWithoutSilence", EventAtTime(BytesDropped{"over-1000", "A", 0}),
        R"("ev":"drop","port":"com1","why":"over-1000","hex":"41"})"},
-      {"Lost", Event(PortChanged{"lost", "EIO", "gone"}),
+      {"Lost", EventAtTime(PortChanged{"lost", "EIO", "gone"}),
        R"("ev":"port","port":"com1","state":"lost","errno":"EIO","text":"gone"})"},
-      {"Back", Event(PortChanged{"back", "", "here"}),
+      {"Back", EventAtTime(PortChanged{"back", "", "here"}),
        R"("ev":"port","port":"com1","state":"back","text":"here"})"},
-      {"Staged", Event(SettingChanged{"staged", "baud", "19200", "9600"}),
+      {"Staged", EventAtTime(SettingChanged{"staged", "baud", "19200", "9600"}),
        R"("ev":"setting","port":"com1","state":"staged","key":"baud","value":"19200","previous":"9600"})"},
-      {"Console", Event(ConsoleReplied{"get_stat", true, "Connected"}),
+      {"Console", EventAtTime(ConsoleReplied{"get_stat", true, "Connected"}),
        R"("ev":"console","port":"com1","command":"get_stat","ok":true,"text":"Connected"})"},
-      {"Note", Event(NoteMade{"note"}), R"("ev":"note","port":"com1","text":"note"})"},
-      {"Finding", Event(FindingMade{"differs", "A", "B"}),
+      {"Note", EventAtTime(NoteMade{"note"}), R"("ev":"note","port":"com1","text":"note"})"},
+      {"Finding", EventAtTime(FindingMade{"differs", "A", "B"}),
        R"("ev":"finding","port":"com1","text":"differs","driver":"41","model":"42"})"},
   };
 }
@@ -76,7 +77,7 @@ TEST(EventJsonBytesTest, EveryByteSurvivesAndTheLineIsPlainAscii) {
     bytes += static_cast<char>(static_cast<unsigned char>(value));
   }
   bytes += "\xC2\x9B";  // valid UTF-8 for the control character that begins an escape sequence
-  const std::string line = ToJsonLine(Event(TokenReceived{1, bytes, 258, 1, -1, false, ""}));
+  const std::string line = ToJsonLine(EventAtTime(TokenReceived{1, bytes, 258, 1, -1, false, ""}));
   EXPECT_TRUE(std::all_of(line.begin(), line.end(),
                           [](unsigned char byte) { return byte >= 0x20 && byte < 0x7F; }));
   HostEvent event;

@@ -12,9 +12,9 @@
 
 namespace {
 
-HostEvent Event(HostEvent::Detail detail) { return {0, "com1", std::move(detail)}; }
+HostEvent EventNow(HostEvent::Detail detail) { return {0, "com1", std::move(detail)}; }
 
-std::string Text(HostEvent::Detail detail) { return EventText(Event(std::move(detail))); }
+std::string Text(HostEvent::Detail detail) { return EventText(EventNow(std::move(detail))); }
 
 TEST(EventTextTest, SaysEachKind) {
   EXPECT_EQ(Text(BytesReceived{"\x02"
@@ -67,10 +67,10 @@ TEST(TokenFormatTest, PutsTheTokenIn) {
   TokenFormat format;
   std::string error;
   ASSERT_TRUE(TokenFormat::Parse("%n %l [%p] %x %a %P %%\\t.", &format, &error));
-  EXPECT_EQ(format.Write(Event(TokenReceived{7, "A\x1B", 2, 3, -1, false, ""})),
+  EXPECT_EQ(format.Write(EventNow(TokenReceived{7, "A\x1B", 2, 3, -1, false, ""})),
             "7 2 [A\\x1b] 41 1B 3 com1 %\t.");
   ASSERT_TRUE(TokenFormat::Parse("%j", &format, &error));
-  EXPECT_EQ(format.Write(Event(TokenReceived{7, "A", 1, 3, -1, false, ""})),
+  EXPECT_EQ(format.Write(EventNow(TokenReceived{7, "A", 1, 3, -1, false, ""})),
             R"({"t":"1970-01-01T00:00:00.000000Z","ev":"token","port":"com1","n":7,"len":1,)"
             R"("text":"A","hex":"41","waiting":3})");
 }

@@ -13,7 +13,7 @@
 
 namespace {
 
-constexpr int kGapMs = 20;
+constexpr int kReplayGapMs = 20;
 
 ReplayResult Replay(const std::string& configuration, const LineScript& script) {
   return ReplayThroughDriver(PluginLibrary::DefaultPath(), configuration, script);
@@ -24,12 +24,12 @@ std::vector<std::string> Expected(const std::string& configuration, const LineSc
   ByteLabeller labeller(FramingOfConfiguration(configuration), &log);
   for (const LineEvent& event : script) {
     if (event.bytes.empty()) {
-      labeller.OnSilence(kGapMs);
+      labeller.OnSilence(kReplayGapMs);
     } else {
       labeller.OnBytes(event.bytes);
     }
   }
-  labeller.OnSilence(kGapMs);
+  labeller.OnSilence(kReplayGapMs);
   EXPECT_TRUE(log.IsGapless());
   EXPECT_EQ(labeller.OpenBytes(), 0U);
   std::vector<std::string> tokens;

@@ -27,7 +27,7 @@ constexpr std::size_t kLongest = 4;  // instrumented code is ten times slower
 constexpr std::size_t kLongest = 7;
 #endif
 
-constexpr int kGapMs = 1;
+constexpr int kCheckGapMs = 1;
 constexpr int kPause = -1;
 constexpr std::size_t kQueueTokens = 10000;
 constexpr int kTokenCharacters = 2100;
@@ -71,7 +71,7 @@ class ScriptedDriver {
   std::vector<std::string> Receive(const std::vector<int>& line) {
     for (const int event : line) {
       if (event == kPause) {
-        host_.Line().Silence(kGapMs);
+        host_.Line().Silence(kCheckGapMs);
       } else {
         host_.Line().Feed(std::string(1, static_cast<char>(event)));
       }
@@ -136,7 +136,7 @@ std::string Show(const std::vector<int>& line) {
 void Feed(const std::vector<int>& line, ByteLabeller* labeller) {
   for (const int event : line) {
     if (event == kPause) {
-      labeller->OnSilence(kGapMs);
+      labeller->OnSilence(kCheckGapMs);
     } else {
       labeller->OnBytes(std::string(1, static_cast<char>(event)));
     }

@@ -8,14 +8,11 @@
 
 #include "tests/host/support/ProgramRun.h"
 #include "tests/host/support/TemporaryFolder.h"
+#include "tests/host/support/TextParts.h"
 
 namespace {
 
 using Words = std::vector<std::string>;
-
-bool Holds(const std::string& text, const std::string& part) {
-  return text.find(part) != std::string::npos;
-}
 
 // Runs the example line at the end of a help text: its commands, joined by a pipe, on this program.
 void ExpectExampleRuns(const Words& command) {

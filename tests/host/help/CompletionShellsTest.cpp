@@ -13,7 +13,7 @@
 
 namespace {
 
-constexpr int kLimitMs = 60000;
+constexpr int kShellLimitMs = 60000;
 
 using Words = std::set<std::string>;
 
@@ -88,7 +88,7 @@ class CompletionTest : public ::testing::TestWithParam<Offer> {
     words.insert(words.end(), arguments.begin(), arguments.end());
     ChildProcess process("/bin/sh", words);
     Words offered;
-    const Deadline deadline = Deadline::After(kLimitMs);
+    const Deadline deadline = Deadline::After(kShellLimitMs);
     for (std::string line; process.ReadLine(deadline, &line);) {
       offered.insert(line);
     }

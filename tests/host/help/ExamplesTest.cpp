@@ -23,7 +23,7 @@
 
 namespace {
 
-constexpr int kLimitMs = 30000;
+constexpr int kExampleLimitMs = 30000;
 constexpr int kTerminated = 128 + SIGTERM;
 
 // What is there before the example runs.
@@ -120,16 +120,16 @@ class ExamplesTest : public ::testing::TestWithParam<Expectation> {
     std::filesystem::create_symlink(PluginLibrary::DefaultPath(), folder_.File("libLOKA.so"));
     if (GetParam().scene == Scene::kStored) {
       ChildProcess store("/bin/sh", Shell("loka store set baud=19200 rx_suffix=CRLF >store.log"));
-      ASSERT_EQ(store.Wait(Deadline::After(kLimitMs)), 0);
+      ASSERT_EQ(store.Wait(Deadline::After(kExampleLimitMs)), 0);
       ChildProcess exported("/bin/sh", Shell("loka store export >settings.json"));
-      ASSERT_EQ(exported.Wait(Deadline::After(kLimitMs)), 0);
+      ASSERT_EQ(exported.Wait(Deadline::After(kExampleLimitMs)), 0);
     }
     if (GetParam().scene == Scene::kRunning) {
       owner_ = std::make_unique<ChildProcess>(
           "/bin/sh", Shell("exec loka run scale.cfg.port --config scale.cfg --ack never 2>&1"));
       std::string line;
       while (line.find("commands attach at") == std::string::npos) {
-        ASSERT_TRUE(owner_->ReadLine(Deadline::After(kLimitMs), &line));
+        ASSERT_TRUE(owner_->ReadLine(Deadline::After(kExampleLimitMs), &line));
       }
     }
     if (GetParam().scene == Scene::kDevice) {
@@ -178,7 +178,7 @@ TEST_P(ExamplesTest, DoesWhatItShows) {
   bool isFound = std::string(expected.output).empty();
   std::string output;
   std::string text;
-  const Deadline deadline = Deadline::After(kLimitMs);
+  const Deadline deadline = Deadline::After(kExampleLimitMs);
   while (process.ReadLine(deadline, &text)) {
     output += text + "\n";
     isFound = isFound || std::regex_match(text, wanted);
@@ -193,11 +193,11 @@ TEST_P(ExamplesTest, DoesWhatItShows) {
   EXPECT_EQ(process.Wait(deadline), expected.status) << example << "\n" << output;
 }
 
-std::string NameOf(const ::testing::TestParamInfo<Expectation>& entry) {
+std::string NameOfExample(const ::testing::TestParamInfo<Expectation>& entry) {
   return Replaced(std::string(entry.param.path).substr(1), "/", "_");
 }
 
-INSTANTIATE_TEST_SUITE_P(Help, ExamplesTest, ::testing::ValuesIn(kExpectations), NameOf);
+INSTANTIATE_TEST_SUITE_P(Help, ExamplesTest, ::testing::ValuesIn(kExpectations), NameOfExample);
 
 TEST(Examples, NoneIsLeftOut) {
   const CommandTree tree;

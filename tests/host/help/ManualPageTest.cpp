@@ -20,6 +20,7 @@
 #include "host/events/EventJson.h"
 #include "host/events/EventKeys.h"
 #include "host/port/PortOptions.h"
+#include "tests/host/support/TextParts.h"
 
 namespace {
 
@@ -47,10 +48,6 @@ std::string WithoutMarks(const std::string& text) {
     }
   }
   return plain;
-}
-
-bool Holds(const std::string& text, const std::string& part) {
-  return text.find(part) != std::string::npos;
 }
 
 TEST(ManualPage, HasEveryCommandAndOptionWithItsMeaning) {

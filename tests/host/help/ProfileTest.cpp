@@ -10,12 +10,9 @@
 #include "host/commands/ProfileUse.h"
 #include "host/port/PseudoTerminal.h"
 #include "tests/host/support/ProgramRun.h"
+#include "tests/host/support/TextParts.h"
 
 namespace {
-
-bool Holds(const std::string& text, const std::string& part) {
-  return text.find(part) != std::string::npos;
-}
 
 class ProfileTest : public ::testing::Test {
  protected:

@@ -74,11 +74,11 @@ TEST(LineIntake, FirstSignalCounts) {
 // Each of these would wait for the whole limit if nobody woke it up; a deadline of 0 returns the
 // same, so the time is looked at. The limit leaves a margin of a minute.
 TEST(LineIntake, WakesUpForEverythingThatMatters) {
-  constexpr int kLimitMs = 120000;
+  constexpr int kWakeLimitMs = 120000;
   constexpr int kMarginMs = 60000;
   LineIntake intake;
   const auto expectWake = [&](const std::function<void()>& cause, const char* name) {
-    const Deadline deadline = Deadline::After(kLimitMs);
+    const Deadline deadline = Deadline::After(kWakeLimitMs);
     std::thread other(cause);
     (void)intake.Take(deadline);
     other.join();

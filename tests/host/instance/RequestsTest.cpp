@@ -12,13 +12,12 @@
 #include "host/text/ByteText.h"
 #include "tests/host/control/ControlFolder.h"
 #include "tests/host/support/PluginConfiguration.h"
+#include "tests/host/support/TestLimit.h"
 #include "tests/support/PluginLibrary.h"
 
 namespace {
 
 using Json = nlohmann::json;
-
-constexpr int kLimitMs = 20000;
 
 class EventLog final : public EventSink {
  public:

@@ -14,12 +14,11 @@
 #include "tests/host/support/PluginConfiguration.h"
 #include "tests/host/support/ProgramRun.h"
 #include "tests/host/support/TemporaryFolder.h"
+#include "tests/host/support/TestLimit.h"
 
 namespace fs = std::filesystem;
 
 namespace {
-
-constexpr int kLimitMs = 20000;
 
 // A line under a name that stays when another pseudo-terminal takes its place.
 class ReplaceableLine {

@@ -10,10 +10,10 @@
 #include "interfaces/ISerialPort.h"
 #include "tests/host/port/CountingObserver.h"
 #include "tests/host/port/FakeTerminalCalls.h"
+#include "tests/host/support/TestLimit.h"
 
 namespace {
 
-constexpr int kLimitMs = 20000;
 using Calls = std::vector<std::string>;
 
 class PortOptionEffectsTest : public testing::Test {

@@ -18,11 +18,11 @@
 #include "host/runtime/HostSession.h"
 #include "host/runtime/TokenReader.h"
 #include "tests/host/support/PluginConfiguration.h"
+#include "tests/host/support/TestLimit.h"
 #include "tests/support/PluginLibrary.h"
 
 namespace {
 
-constexpr int kLimitMs = 20000;
 constexpr int kGapMs = 10;
 // Between two tokens. A third of it is the gap, so a stamp may be 20 ms late before two are joined.
 constexpr int kPauseMs = 30;

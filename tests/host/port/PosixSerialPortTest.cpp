@@ -12,10 +12,9 @@
 #include "host/port/PosixSerialPort.h"
 #include "host/port/PseudoTerminal.h"
 #include "tests/host/port/CountingObserver.h"
+#include "tests/host/support/TestLimit.h"
 
 namespace {
-
-constexpr int kLimitMs = 20000;
 
 std::unique_ptr<PosixSerialPort> OpenPort(const std::string& path, PortObserver* observer) {
   PortProblem problem;

@@ -8,12 +8,12 @@
 #include "host/runtime/HostSession.h"
 #include "tests/host/port/CountingObserver.h"
 #include "tests/host/support/PluginConfiguration.h"
+#include "tests/host/support/TestLimit.h"
 #include "tests/support/PluginLibrary.h"
 
 namespace {
 
 constexpr int kGapMs = 200;
-constexpr int kLimitMs = 20000;
 // The margin that a disconnect has beyond one time-out of the port.
 constexpr int kMarginMs = 100;
 constexpr int kRounds = 100;

@@ -8,10 +8,9 @@
 
 #include "host/base/Deadline.h"
 #include "host/runtime/HostEvents.h"
+#include "tests/host/support/TestLimit.h"
 
 namespace {
-
-constexpr int kLimitMs = 20000;
 
 TEST(HostEvents, ConditionThatHoldsNeedsNoEvent) {
   HostEvents events(nullptr);

@@ -10,11 +10,10 @@
 #include "tests/host/port/CountingObserver.h"
 #include "tests/host/support/PluginConfiguration.h"
 #include "tests/host/support/TemporaryFolder.h"
+#include "tests/host/support/TestLimit.h"
 #include "tests/support/PluginLibrary.h"
 
 namespace {
-
-constexpr int kLimitMs = 20000;
 
 class HostSessionTest : public testing::Test {
  protected:

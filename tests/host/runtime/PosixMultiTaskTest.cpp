@@ -6,10 +6,9 @@
 
 #include "host/runtime/PosixMultiTask.h"
 #include "interfaces/ITaskRunner.h"
+#include "tests/host/support/TestLimit.h"
 
 namespace {
-
-constexpr int kLimitMs = 20000;
 
 // Runs until the task is asked to end and the test lets it go.
 class PatientRunner final : public ITaskRunner {

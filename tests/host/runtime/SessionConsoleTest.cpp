@@ -7,11 +7,10 @@
 #include "host/runtime/SessionConsole.h"
 #include "tests/host/support/PluginConfiguration.h"
 #include "tests/host/support/TemporaryFolder.h"
+#include "tests/host/support/TestLimit.h"
 #include "tests/support/PluginLibrary.h"
 
 namespace {
-
-constexpr int kLimitMs = 20000;
 
 class SessionConsoleTest : public testing::Test {
  protected:

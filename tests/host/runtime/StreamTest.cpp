@@ -25,7 +25,7 @@
 
 namespace {
 
-constexpr int kLimitMs = 60000;
+constexpr int kStreamLimitMs = 60000;
 #ifdef LOKA_IS_SANITIZED
 constexpr long kDefaultTokens = 50000;
 #else
@@ -85,7 +85,7 @@ TEST_F(StreamTest, ArrivesWithoutLossOrChangeWhenTheReaderKeepsUp) {
       for (const long end = std::min(count, next + kChunk); next < end; ++next) {
         bytes += Framed(next);
       }
-      if (!line_.Send(bytes, Deadline::After(kLimitMs))) {
+      if (!line_.Send(bytes, Deadline::After(kStreamLimitMs))) {
         ADD_FAILURE() << "the device cannot send";
         return;
       }
@@ -96,8 +96,9 @@ TEST_F(StreamTest, ArrivesWithoutLossOrChangeWhenTheReaderKeepsUp) {
   ReceivedToken token;
   unsigned int waiting = 0;
   while (taken < count) {
-    const bool isThere = events_.WaitUntil(
-        [&] { return reader.CountWaiting(&waiting) && waiting > 0; }, Deadline::After(kLimitMs));
+    const bool isThere =
+        events_.WaitUntil([&] { return reader.CountWaiting(&waiting) && waiting > 0; },
+                          Deadline::After(kStreamLimitMs));
     const bool isTaken = isThere && reader.Take(&token) == TokenReader::Outcome::kToken;
     if (!isTaken || token.bytes != TokenText(taken)) {
       ADD_FAILURE() << "token " << taken << ": " << (isTaken ? token.bytes : "none");
@@ -120,9 +121,9 @@ TEST_F(StreamTest, NewestTokensAreThereWhenTheReaderDoesNotKeepUp) {
   for (long number = 0; number < kSent; ++number) {
     bytes += Framed(number);
   }
-  ASSERT_TRUE(line_.Send(bytes, Deadline::After(kLimitMs)));
+  ASSERT_TRUE(line_.Send(bytes, Deadline::After(kStreamLimitMs)));
   ASSERT_TRUE(events_.WaitUntil([&] { return events_.Progress().receivedBytes == bytes.size(); },
-                                Deadline::After(kLimitMs)));
+                                Deadline::After(kStreamLimitMs)));
   TokenReader reader(session_.get());
   ReceivedToken token;
   for (long number = kSent - kQueueSize; number < kSent; ++number) {

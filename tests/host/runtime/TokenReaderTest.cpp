@@ -8,11 +8,11 @@
 #include "host/runtime/TokenReader.h"
 #include "tests/host/port/CountingObserver.h"
 #include "tests/host/support/PluginConfiguration.h"
+#include "tests/host/support/TestLimit.h"
 #include "tests/support/PluginLibrary.h"
 
 namespace {
 
-constexpr int kLimitMs = 20000;
 using Outcome = TokenReader::Outcome;
 
 class TokenReaderTest : public testing::Test {

@@ -5,10 +5,10 @@
 
 #include "host/sim/DevicePort.h"
 #include "tests/host/sim/HostEnd.h"
+#include "tests/host/support/TestLimit.h"
 
 namespace {
 
-constexpr int kLimitMs = 10000;
 constexpr std::size_t kAny = 1;
 
 TEST(DevicePort, SeesWhoOpensAndClosesIt) {

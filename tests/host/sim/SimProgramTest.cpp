@@ -11,13 +11,13 @@
 #include "tests/host/sim/HostEnd.h"
 #include "tests/host/sim/SimProcess.h"
 #include "tests/host/support/PluginConfiguration.h"
+#include "tests/host/support/TestLimit.h"
 #include "tests/support/ReferenceFramer.h"
 
 namespace {
 
 namespace fs = std::filesystem;
 
-constexpr int kLimitMs = 20000;
 constexpr std::size_t kEverything = 100000000;
 
 bool HasLink(const std::string& path) { return fs::is_symlink(fs::symlink_status(path)); }

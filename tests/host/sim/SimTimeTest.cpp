@@ -5,10 +5,10 @@
 #include "tests/host/sim/HostEnd.h"
 #include "tests/host/sim/SimProcess.h"
 #include "tests/host/support/PluginConfiguration.h"
+#include "tests/host/support/TestLimit.h"
 
 namespace {
 
-constexpr int kLimitMs = 20000;
 constexpr std::size_t kEverything = 100000000;
 
 std::int64_t TimeOf(const SimProcess::Json& event) {

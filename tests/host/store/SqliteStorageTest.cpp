@@ -14,6 +14,7 @@
 
 #include "host/store/SqliteStorage.h"
 #include "host/store/StorageBatch.h"
+#include "tests/host/support/FileMode.h"
 #include "tests/host/support/TemporaryFolder.h"
 
 namespace {
@@ -21,12 +22,6 @@ namespace {
 constexpr const char* kTwelveKeys[] = {"baud",      "parity",    "bits",      "stop",
                                        "mode",      "rx_prefix", "rx_suffix", "tx_prefix",
                                        "tx_suffix", "gap",       "hex",       "queue"};
-
-unsigned int ModeOf(const std::string& path) {
-  struct stat status {};
-  EXPECT_EQ(stat(path.c_str(), &status), 0) << path;
-  return status.st_mode & 07777U;
-}
 
 std::string Contents(const std::string& path) {
   std::ifstream file(path, std::ios::binary);

@@ -18,6 +18,7 @@
 class ProgramRun {
  public:
   static constexpr int kLimitMs = 30000;
+  static Deadline Limit() { return Deadline::After(kLimitMs); }
 
   explicit ProgramRun(const std::vector<std::string>& arguments,
                       const std::string& environment = "") {

@@ -3,14 +3,9 @@
 #include <gtest/gtest.h>
 
 #include "tests/host/commands/InstanceRun.h"
+#include "tests/host/support/TextParts.h"
 
 namespace {
-
-Deadline Limit() { return Deadline::After(ProgramRun::kLimitMs); }
-
-bool Holds(const std::string& text, const std::string& part) {
-  return text.find(part) != std::string::npos;
-}
 
 class TermProgram : public testing::Test {
  protected:
@@ -21,10 +16,10 @@ class TermProgram : public testing::Test {
     arguments.insert(arguments.end(), options.begin(), options.end());
     return std::make_unique<ProgramRun>(arguments);
   }
-  bool DeviceSends(const std::string& bytes) { return line_.Send(bytes, Limit()); }
+  bool DeviceSends(const std::string& bytes) { return line_.Send(bytes, ProgramRun::Limit()); }
   std::string DeviceGets(std::size_t count) {
     std::string bytes;
-    EXPECT_TRUE(line_.Receive(count, Limit(), &bytes));
+    EXPECT_TRUE(line_.Receive(count, ProgramRun::Limit(), &bytes));
     return bytes;
   }
 
@@ -110,9 +105,9 @@ TEST_F(TermProgram, AttachesToARunningInstanceAndEndsWithIt) {
   ASSERT_TRUE(run->AwaitErrors("attached to the running instance com1")) << run->Errors();
   ASSERT_TRUE(run->Type("R"));
   std::string bytes;
-  EXPECT_TRUE(instance.Line().Receive(2, Limit(), &bytes));
+  EXPECT_TRUE(instance.Line().Receive(2, ProgramRun::Limit(), &bytes));
   EXPECT_EQ(bytes, "R\r");
-  ASSERT_TRUE(instance.Line().Send("A\x03", Limit()));
+  ASSERT_TRUE(instance.Line().Send("A\x03", ProgramRun::Limit()));
   EXPECT_EQ(run->Line(), "A");
   instance.Stop();
   EXPECT_EQ(run->Output(), "");

@@ -19,7 +19,7 @@ namespace {
 
 // Texts that are too long for a small string, so that copies of them allocate.
 const std::string kHexText(40, 'A');
-const std::string kConfig =
+const std::string kMemoryConfig =
     "CfgVer=1 model=1 port=/dev/serial/by-id/a-rather-long-name baudrate=9600 parity=even bits=8 "
     "stopbits=1 mode=RS-232 Node1::model=1 rx_prefix=02 rx_suffix=03 tx_prefix=" +
     kHexText + " tx_suffix=" + kHexText + " token_queue_size=100";
@@ -29,7 +29,7 @@ class Protocol_LOKAMemoryTest : public testing::Test {
   void MakeStarted() {
     protocol_.reset();
     protocol_ = std::make_unique<Protocol_LOKA>();
-    ASSERT_NE(protocol_->Config(kConfig.c_str()), 0);
+    ASSERT_NE(protocol_->Config(kMemoryConfig.c_str()), 0);
     ASSERT_NE(protocol_->Start(), 0);
   }
 
@@ -109,7 +109,7 @@ TEST_F(Protocol_LOKAMemoryTest, Create) {
 
 TEST_F(Protocol_LOKAMemoryTest, Config) {
   const int allocations = FailEach([this] { protocol_ = std::make_unique<Protocol_LOKA>(); },
-                                   [this] { return protocol_->Config(kConfig.c_str()); });
+                                   [this] { return protocol_->Config(kMemoryConfig.c_str()); });
   EXPECT_GT(allocations, 5);
 }
 
@@ -117,7 +117,7 @@ TEST_F(Protocol_LOKAMemoryTest, Start) {
   const int allocations = FailEach(
       [this] {
         protocol_ = std::make_unique<Protocol_LOKA>();
-        ASSERT_NE(protocol_->Config(kConfig.c_str()), 0);
+        ASSERT_NE(protocol_->Config(kMemoryConfig.c_str()), 0);
       },
       [this] { return protocol_->Start(); });
   EXPECT_GT(allocations, 5);

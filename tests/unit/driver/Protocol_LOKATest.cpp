@@ -13,13 +13,13 @@
 
 namespace {
 
-const std::string kConfig =
+const std::string kDriverConfig =
     "CfgVer=1 model=1 port=com1 baudrate=9600 parity=even bits=8 stopbits=1 mode=RS-232 ";
 
 class Protocol_LOKATest : public testing::Test {
  protected:
   void Start(const std::string& moreConfig = "") {
-    ASSERT_NE(protocol_.Config((kConfig + moreConfig).c_str()), 0)
+    ASSERT_NE(protocol_.Config((kDriverConfig + moreConfig).c_str()), 0)
         << protocol_.GetLastErrorString();
     ASSERT_NE(protocol_.Start(), 0) << protocol_.GetLastErrorString();
   }
@@ -325,7 +325,7 @@ TEST_F(Protocol_LOKATest, ReadOnlyTypesAreNotWritten) {
 }
 
 TEST_F(Protocol_LOKATest, NothingIsAccessedBeforeTheStart) {
-  ASSERT_NE(protocol_.Config(kConfig.c_str()), 0);
+  ASSERT_NE(protocol_.Config(kDriverConfig.c_str()), 0);
   Bytes value(16);
   EXPECT_EQ(protocol_.ReadBlock(Tag("0?connect?boolean"), value.data(), 1), 0);
   ExpectError(-3, "Protocol not started");
@@ -369,7 +369,7 @@ TEST_F(Protocol_LOKATest, ApplyingNothingKeepsTheDataBitsAndThePort) {
 
 TEST(Protocol_LOKAWithoutHostTest, DoesWhatItCan) {
   Protocol_LOKA protocol;
-  ASSERT_NE(protocol.Config((kConfig + "autoConnect=false").c_str()), 0);
+  ASSERT_NE(protocol.Config((kDriverConfig + "autoConnect=false").c_str()), 0);
   EXPECT_NE(protocol.Start(), 0);
   ITag* const tag = protocol.CreateTag("0?connect?boolean");
   ASSERT_NE(tag, nullptr);
@@ -383,7 +383,7 @@ TEST(Protocol_LOKAWithoutHostTest, DoesWhatItCan) {
 
 TEST(Protocol_LOKAWithoutHostTest, CannotOpenItsPort) {
   Protocol_LOKA protocol;
-  ASSERT_NE(protocol.Config(kConfig.c_str()), 0);
+  ASSERT_NE(protocol.Config(kDriverConfig.c_str()), 0);
   EXPECT_EQ(protocol.Start(), 0);
   EXPECT_EQ(protocol.GetLastError(), -1);
   EXPECT_STREQ(protocol.GetLastErrorString(), "Can't open serial port");
@@ -393,7 +393,7 @@ TEST(Protocol_LOKAWithoutHostTest, ClosesItsPortWithoutSemaphores) {
   HostInUse host;
   piMultiTask = nullptr;
   Protocol_LOKA protocol;
-  ASSERT_NE(protocol.Config(kConfig.c_str()), 0);
+  ASSERT_NE(protocol.Config(kDriverConfig.c_str()), 0);
   ASSERT_NE(protocol.Start(), 0);
   ITag* const tag = protocol.CreateTag("0?connect?boolean");
   ASSERT_NE(tag, nullptr);
@@ -406,7 +406,7 @@ TEST(Protocol_LOKAWithoutHostTest, GivesEverythingBack) {
   HostInUse host;
   {
     Protocol_LOKA protocol;
-    ASSERT_NE(protocol.Config(kConfig.c_str()), 0);
+    ASSERT_NE(protocol.Config(kDriverConfig.c_str()), 0);
     ASSERT_NE(protocol.Start(), 0);
     // Neither stopped nor closed.
   }

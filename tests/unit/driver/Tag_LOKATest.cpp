@@ -13,13 +13,13 @@
 
 namespace {
 
-const char* const kConfig =
+const char* const kTagConfig =
     "CfgVer=1 model=1 port=com1 baudrate=9600 parity=none bits=8 stopbits=1 mode=RS-232 "
     "Node1::x=1 Node2::model=strange";
 
 class Tag_LOKATest : public testing::Test {
  protected:
-  Tag_LOKATest() { EXPECT_NE(protocol_.Config(kConfig), 0); }
+  Tag_LOKATest() { EXPECT_NE(protocol_.Config(kTagConfig), 0); }
 
   void ExpectRefused(const char* uri, const std::string& reason) {
     const Tag_LOKA tag(uri, protocol_);

@@ -89,14 +89,14 @@ TEST(TokenQueueTest, ClearDropsEverything) {
 TEST(TokenQueueTest, FailedPushChangesNothing) {
   TokenQueue queue;
   queue.Push("oldest", 3);
-  // From some push on, the queue needs another block of memory.
+  // From some push on, the queue needs more memory.
   bool hasFailed = false;
   for (int i = 0; i < 2000 && !hasFailed; ++i) {
     const int before = queue.Count();
-    std::string token = "t";
+    const std::string token(static_cast<std::size_t>(i), 't');
     const FailingNew noMemory(1);
     try {
-      queue.Push(std::move(token), before);
+      queue.Push(token, before);
     } catch (const std::bad_alloc&) {
       hasFailed = true;
       EXPECT_EQ(queue.Count(), before);
@@ -105,4 +105,43 @@ TEST(TokenQueueTest, FailedPushChangesNothing) {
   }
   EXPECT_TRUE(hasFailed);
   EXPECT_EQ(queue.Count(), 1);
+}
+
+TEST(TokenQueueTest, FailedGrowthKeepsWhatIsThere) {
+  TokenQueue queue;
+  Texts expected;
+  for (int i = 0; i < 1000; ++i) {
+    const std::string token = std::to_string(i);
+    const FailingNew noMemory(1);
+    try {
+      queue.Push(token, 2000);
+    } catch (const std::bad_alloc&) {
+      break;
+    }
+    expected.push_back(token);
+  }
+  EXPECT_LT(expected.size(), 1000U);
+  queue.Push("next", 2000);
+  expected.emplace_back("next");
+  EXPECT_EQ(Drained(queue), expected);
+}
+
+TEST(TokenQueueTest, SteadyStreamOfShortTokensNeedsNoMemory) {
+  TokenQueue queue;
+  const std::string token(60, 't');
+  for (int i = 0; i < 100; ++i) queue.Push(token, 8);
+  const FailingNew noMemory(1);
+  for (int i = 0; i < 100; ++i) {
+    queue.Push(token, 8);
+    queue.PopFront();
+    queue.Push(token, 8);
+  }
+  EXPECT_FALSE(noMemory.HasFailed());
+}
+
+TEST(TokenQueueTest, HexTextTakesThePlaceOfWhatItsSlotHeld) {
+  TokenQueue queue;
+  for (int i = 0; i < 20; ++i) queue.Push("longer than the next", 1);
+  for (int i = 0; i < 20; ++i) queue.PushHex(std::string("\0\xAF", 2), 4);
+  EXPECT_EQ(Drained(queue), (Texts{"00AF", "00AF", "00AF", "00AF"}));
 }

@@ -15,11 +15,6 @@ namespace {
 
 constexpr unsigned long long kNoStamp = 0xDEADBEEF;
 
-void ExpectError(const FakeDriver& driver, int code, const char* text) {
-  EXPECT_EQ(driver.GetLastError(), code);
-  EXPECT_STREQ(driver.GetLastErrorString(), text);
-}
-
 // A driver that reads runs of bits.
 class BitBlockDriver final : public FakeDriver {
  public:
@@ -36,7 +31,7 @@ class BitBlockDriver final : public FakeDriver {
 };
 
 // A driver that reads datagrams.
-class DatagramDriver final : public FakeDriver {
+class ImageDriver final : public FakeDriver {
  public:
   int ReadDatagram(const ITag* const* /*tags*/, int /*count*/, unsigned char* buffer) override {
     buffer[0] = 0x77;
@@ -315,7 +310,7 @@ TEST(ProtocolBaseAccessTest, BlockReadPassesItsLengthOn) {
 // --- datagrams ---
 
 TEST(ProtocolBaseAccessTest, ReadDatagramMarksEveryTag) {
-  DatagramDriver driver;
+  ImageDriver driver;
   driver.datagramResult = 6;
   const FakeTag tag("int");
   const ITag* const tags[] = {&tag, &tag, &tag};
@@ -330,7 +325,7 @@ TEST(ProtocolBaseAccessTest, ReadDatagramMarksEveryTag) {
 }
 
 TEST(ProtocolBaseAccessTest, FailedDatagramLeavesStatusAndStamps) {
-  DatagramDriver driver;
+  ImageDriver driver;
   driver.datagramResult = 0;
   const FakeTag tag("int");
   const ITag* const tags[] = {&tag};
@@ -358,7 +353,7 @@ TEST(ProtocolBaseAccessTest, DriverWithoutDatagramsReadsNone) {
 // So many tags that asking the clock for each of them would take several of its milliseconds.
 TEST(ProtocolBaseAccessTest, AllTagsOfADatagramGetOneStamp) {
   constexpr std::size_t kTags = 500000;
-  DatagramDriver driver;
+  ImageDriver driver;
   driver.datagramResult = 6;
   const FakeTag tag("int");
   const std::vector<const ITag*> tags(kTags, &tag);
@@ -401,7 +396,7 @@ TEST(ProtocolBaseAccessTest, StampedDatagramUsesTheDriversStatus) {
 }
 
 TEST(ProtocolBaseAccessTest, StatusAndStampsMayBeLeftOut) {
-  DatagramDriver driver;
+  ImageDriver driver;
   const FakeTag tag("int");
   const ITag* const tags[] = {&tag};
   Bytes buffer(4);

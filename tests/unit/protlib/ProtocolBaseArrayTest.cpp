@@ -10,11 +10,6 @@
 
 namespace {
 
-void ExpectError(const FakeDriver& driver, int code, const char* text) {
-  EXPECT_EQ(driver.GetLastError(), code);
-  EXPECT_STREQ(driver.GetLastErrorString(), text);
-}
-
 // Number of allocations of one access to the last item of an array of that many bytes.
 template <typename Access>
 long long Allocations(int lengthBytes, Access access) {

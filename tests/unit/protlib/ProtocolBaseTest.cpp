@@ -12,11 +12,6 @@
 
 namespace {
 
-void ExpectError(const IProtocol& driver, int code, const char* text) {
-  EXPECT_EQ(driver.GetLastError(), code);
-  EXPECT_STREQ(driver.GetLastErrorString(), text);
-}
-
 void ExpectNoError(const IProtocol& driver) { ExpectError(driver, 1, ""); }
 
 }  // namespace

@@ -11,12 +11,12 @@
 namespace {
 
 // Notes the order in which tags go.
-class NotingTag final : public FakeTag {
+class PassingTag final : public FakeTag {
  public:
-  NotingTag(std::vector<int>& gone, int number) : gone_(gone), number_(number) {}
-  NotingTag(const NotingTag&) = delete;
-  NotingTag& operator=(const NotingTag&) = delete;
-  ~NotingTag() override { gone_.push_back(number_); }
+  PassingTag(std::vector<int>& gone, int number) : gone_(gone), number_(number) {}
+  PassingTag(const PassingTag&) = delete;
+  PassingTag& operator=(const PassingTag&) = delete;
+  ~PassingTag() override { gone_.push_back(number_); }
 
  private:
   std::vector<int>& gone_;
@@ -29,7 +29,7 @@ TEST(TagListTest, DestroysItsTagsFromTheFront) {
   std::vector<int> gone;
   {
     TagList list;
-    for (int i = 0; i < 5; ++i) list.Append(new NotingTag(gone, i));
+    for (int i = 0; i < 5; ++i) list.Append(new PassingTag(gone, i));
     EXPECT_TRUE(gone.empty());
   }
   EXPECT_EQ(gone, (std::vector<int>{0, 1, 2, 3, 4}));
@@ -38,9 +38,9 @@ TEST(TagListTest, DestroysItsTagsFromTheFront) {
 TEST(TagListTest, RemovedTagBelongsToTheCaller) {
   std::vector<int> gone;
   TagList list;
-  auto* first = new NotingTag(gone, 1);
+  auto* first = new PassingTag(gone, 1);
   list.Append(first);
-  list.Append(new NotingTag(gone, 2));
+  list.Append(new PassingTag(gone, 2));
   list.Remove(first);
   list.DeleteAll();
   EXPECT_EQ(gone, std::vector<int>{2});
@@ -51,7 +51,7 @@ TEST(TagListTest, RemovedTagBelongsToTheCaller) {
 TEST(TagListTest, RemovesEveryEntryOfATag) {
   std::vector<int> gone;
   TagList list;
-  const auto tag = std::make_unique<NotingTag>(gone, 1);
+  const auto tag = std::make_unique<PassingTag>(gone, 1);
   list.Append(tag.get());
   list.Append(tag.get());
   list.Remove(tag.get());
@@ -62,7 +62,7 @@ TEST(TagListTest, RemovesEveryEntryOfATag) {
 TEST(TagListTest, RemovingAStrangerChangesNothing) {
   std::vector<int> gone;
   TagList list;
-  list.Append(new NotingTag(gone, 1));
+  list.Append(new PassingTag(gone, 1));
   const FakeTag other;
   list.Remove(const_cast<FakeTag*>(&other));
   EXPECT_TRUE(gone.empty());
@@ -73,10 +73,10 @@ TEST(TagListTest, RemovingAStrangerChangesNothing) {
 TEST(TagListTest, CanBeUsedAgainAfterDeleteAll) {
   std::vector<int> gone;
   TagList list;
-  list.Append(new NotingTag(gone, 1));
+  list.Append(new PassingTag(gone, 1));
   list.DeleteAll();
   list.DeleteAll();
-  list.Append(new NotingTag(gone, 2));
+  list.Append(new PassingTag(gone, 2));
   EXPECT_EQ(gone, std::vector<int>{1});
   list.DeleteAll();
   EXPECT_EQ(gone, (std::vector<int>{1, 2}));
@@ -86,7 +86,7 @@ TEST(TagListTest, TagThatCouldNotBeAppendedStaysWithTheCaller) {
   for (int nth = 1;; ++nth) {
     std::vector<int> gone;
     gone.reserve(2);
-    const auto tag = std::make_unique<NotingTag>(gone, 1);
+    const auto tag = std::make_unique<PassingTag>(gone, 1);
     TagList list;
     bool threw = false;
     {
