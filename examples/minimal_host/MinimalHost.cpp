@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
-// The least that a host must be: minimal_host LIBRARY DEVICE COUNT CONFIGURATION prints tokens.
+// The least that a host must be. Prints COUNT tokens, then hands each line to the driver's console.
 #include <dlfcn.h>
 #include <fcntl.h>
 #include <poll.h>
@@ -7,7 +7,8 @@
 #include <unistd.h>
 
 #include <atomic>
-#include <cstdio>
+#include <iostream>
+#include <map>
 #include <mutex>
 #include <string>
 #include <thread>
@@ -44,9 +45,7 @@ struct Task : Object<ITask> {
   ~Task() override { thread.join(); }
   int IsToEnd() override { return isToEnd ? 1 : 0; }
   void reserved4() override {}
-  int Start() override {
-    return thread = std::thread([this] { runner->Task(); }), 1;
-  }
+  int Start() override { return thread = std::thread(&ITaskRunner::Task, runner), 1; }
   ITaskRunner* runner;
   std::atomic<bool> isToEnd{false};
   std::thread thread;
@@ -99,51 +98,52 @@ struct SerialFactory : Service<ISerialFactory> {
   SerialPort port;
 };
 struct HostFactory final : IInterfaceFactory {
-  IInterface* CreateInterface(const char* name) override {
-    if (std::string(name) == "IMultiTask2") return &multiTask;
-    if (std::string(name) == "ISerialFactory") return &serialFactory;
-    if (std::string(name) == "ISocketFactory") return &socketFactory;
-    return std::string(name) == "ICDSBuffer" ? &buffer : nullptr;
-  }
+  IInterface* CreateInterface(const char* name) override { return services[name]; }
   void ReleaseInterface(IInterface* /*interface*/) override {}
   MultiTask multiTask;
   SerialFactory serialFactory;
   Service<ISocketFactory> socketFactory;
   Service<ICDSBuffer> buffer;
+  std::map<std::string, IInterface*> services = {{"IMultiTask2", &multiTask},
+                                                 {"ISerialFactory", &serialFactory},
+                                                 {"ISocketFactory", &socketFactory},
+                                                 {"ICDSBuffer", &buffer}};
 };
 
 int main(int argc, char** argv) {
-  if (argc != 5) return std::fputs("usage: minimal_host LIBRARY DEVICE COUNT CONFIG\n", stderr), 2;
+  if (argc != 5) return std::cerr << "usage: minimal_host LIBRARY DEVICE COUNT CONFIG\n", 2;
   void* const library = dlopen(argv[1], RTLD_NOW);
-  if (library == nullptr) return std::fprintf(stderr, "%s\n", dlerror()), 3;
+  if (library == nullptr) return std::cerr << dlerror() << '\n', 3;
   auto* const factory =
       reinterpret_cast<GetInterfaceFactoryFunction>(dlsym(library, kGetInterfaceFactoryName))();
   auto* const module = static_cast<IProtModule*>(factory->CreateInterface("IProtModule"));
-  auto* const protocols =
-      static_cast<IProtocolFactory*>(factory->CreateInterface("IProtocolFactory"));
+  auto* const maker = static_cast<IProtocolFactory*>(factory->CreateInterface("IProtocolFactory"));
   HostFactory host;
   host.serialFactory.device = argv[2];
-  if (module->Init(&host) == 0) return std::fprintf(stderr, "%s\n", module->GetLastError()), 3;
-  IProtocol* const protocol = protocols->CreateProtocol("LOKA");
+  if (module->Init(&host) == 0) return std::cerr << module->GetLastError() << '\n', 3;
+  IProtocol* const protocol = maker->CreateProtocol("LOKA");
   const bool isStarted = protocol->Config(argv[4]) != 0 && protocol->Start() != 0;
-  if (!isStarted) (void)std::fprintf(stderr, "%s\n", protocol->GetLastErrorString());
+  std::cout << (isStarted ? "started" : protocol->GetLastErrorString()) << std::endl;
   ITag* const available = protocol->CreateTag("0?tokens_available?unsignedInt");
   ITag* const token = protocol->CreateTag("0?rx_token?string-1000");
   ITag* const acknowledge = protocol->CreateTag("0?token_ack?boolean");
-  if (isStarted) std::puts("started");
-  for (int left = isStarted ? std::stoi(argv[3]) : 0; left > 0; (void)std::fflush(stdout)) {
+  for (int left = isStarted ? std::stoi(argv[3]) : 0; left > 0; --left) {
     unsigned int count = 0;
-    unsigned char text[1001];
-    (void)protocol->Read(available, reinterpret_cast<unsigned char*>(&count));
-    if (count == 0 || protocol->Read(token, text) == 0) {
+    unsigned char text[1000] = {};
+    while (protocol->Read(available, reinterpret_cast<unsigned char*>(&count)) == 0 || count == 0) {
       host.multiTask.Sleep(10);
-      continue;
     }
-    left -= std::printf("%s\n", reinterpret_cast<const char*>(text)) > 0 ? 1 : 0;
+    (void)protocol->Read(token, text);
+    std::cout << reinterpret_cast<const char*>(text) << std::endl;
     (void)protocol->Write(acknowledge, reinterpret_cast<const unsigned char*>("\1"));
   }
+  for (std::string line; isStarted && std::getline(std::cin, line);) {
+    char reply[4096] = {};
+    const bool isDone = protocol->DoCommand(line.c_str(), reply, sizeof(reply) - 1);
+    std::cout << reply << '\n' << (isDone ? "true" : "false") << std::endl;
+  }
   protocol->Stop();
-  protocols->DeleteProtocol(protocol);  // with its tags
+  maker->DeleteProtocol(protocol);  // with its tags
   module->Close();
   return dlclose(library) == 0 && isStarted ? 0 : 4;
 }

@@ -10,8 +10,11 @@
 #include <unistd.h>
 
 #include <fstream>
+#include <stdexcept>
 #include <string>
 
+#include "tests/panel/HostChecks.h"
+#include "tests/panel/HostSession.h"
 #include "tests/support/PluginLibrary.h"
 
 namespace {
@@ -21,89 +24,137 @@ constexpr const char* kConfiguration =
     "CfgVer=1 model=1 port=com1 baudrate=9600 parity=none bits=8 stopbits=1 mode=RS-232 "
     "rx_prefix=02 rx_suffix=03";
 
-class MinimalHostTest : public ::testing::Test {
- protected:
-  void SetUp() override {
-    device_ = posix_openpt(O_RDWR | O_NOCTTY);
-    ASSERT_GE(device_, 0);
-    ASSERT_EQ(grantpt(device_), 0);
-    ASSERT_EQ(unlockpt(device_), 0);
+// The minimal host as a process, its port a pseudo-terminal.
+class TerminalSession final : public HostSession {
+ public:
+  explicit TerminalSession(std::string library) : library_(std::move(library)) {
+    device_ = posix_openpt(O_RDWR | O_NOCTTY | O_CLOEXEC);
+    if (device_ < 0 || grantpt(device_) != 0 || unlockpt(device_) != 0) {
+      throw std::runtime_error("no pseudo-terminal");
+    }
     // Held open, so that the device's end never hangs up.
-    line_ = open(ptsname(device_), O_RDWR | O_NOCTTY);
-    ASSERT_GE(line_, 0);
+    line_ = open(ptsname(device_), O_RDWR | O_NOCTTY | O_CLOEXEC);
   }
-  void TearDown() override {
+  ~TerminalSession() override {
     if (program_ > 0) {
       kill(program_, SIGKILL);
       waitpid(program_, nullptr, 0);
     }
-    for (const int file : {output_, line_, device_}) close(file);
+    for (const int file : {input_, output_, line_, device_}) close(file);
   }
 
-  void Start(const std::string& library, const std::string& configuration) {
-    int pipe[2];
-    ASSERT_EQ(pipe2(pipe, O_CLOEXEC), 0);
-    output_ = pipe[0];
+  std::string Start(const std::string& configuration) override {
+    return StartForTokens(configuration, 0);
+  }
+  std::string StartForTokens(const std::string& configuration, int tokens) {
+    int toHost[2];
+    int fromHost[2];
+    if (pipe2(toHost, O_CLOEXEC) != 0 || pipe2(fromHost, O_CLOEXEC) != 0) return "no pipe";
     program_ = fork();
     if (program_ == 0) {
-      dup2(pipe[1], STDOUT_FILENO);
-      dup2(pipe[1], STDERR_FILENO);
-      execl(LOKA_MINIMAL_HOST, LOKA_MINIMAL_HOST, library.c_str(), ptsname(device_), "3",
-            configuration.c_str(), nullptr);
+      dup2(toHost[0], STDIN_FILENO);
+      dup2(fromHost[1], STDOUT_FILENO);
+      dup2(fromHost[1], STDERR_FILENO);
+      execl(LOKA_MINIMAL_HOST, LOKA_MINIMAL_HOST, library_.c_str(), ptsname(device_),
+            std::to_string(tokens).c_str(), configuration.c_str(), nullptr);
       _exit(127);
     }
-    close(pipe[1]);
+    close(toHost[0]);
+    close(fromHost[1]);
+    input_ = toHost[1];
+    output_ = fromHost[0];
+    return OutputLine();
   }
 
-  // What the program writes until its line with this text, or its end.
-  std::string OutputUntil(const std::string& text) {
-    std::string output;
-    char byte = 0;
-    pollfd wait = {output_, POLLIN, 0};
-    while (output.find(text + "\n") == std::string::npos && poll(&wait, 1, kLimitMs) == 1 &&
-           read(output_, &byte, 1) == 1) {
-      output += byte;
-    }
-    return output;
-  }
-
-  int Status() {
+  int End() override {
+    close(input_);
+    input_ = -1;
     int status = 0;
     EXPECT_EQ(waitpid(program_, &status, 0), program_);
     program_ = -1;
     return WIFEXITED(status) ? WEXITSTATUS(status) : -1;
   }
 
+  std::string Ask(const std::string& command) override {
+    const std::string line = command + "\n";
+    EXPECT_EQ(write(input_, line.data(), line.size()), static_cast<ssize_t>(line.size()));
+    std::string output;
+    for (;;) {
+      const std::string next = OutputLine();
+      output += next;
+      if (next == "true" || next == "false" || !isSpeaking_) return output;
+      output += '\n';
+    }
+  }
+
+  // Without its end; what there is when none comes.
+  std::string OutputLine() {
+    std::string output;
+    char byte = 0;
+    while ((isSpeaking_ = ReadByte(output_, byte)) && byte != '\n') output += byte;
+    return output;
+  }
+
+  void SendOnLine(const std::string& bytes) override {
+    EXPECT_EQ(write(device_, bytes.data(), bytes.size()), static_cast<ssize_t>(bytes.size()));
+  }
+  std::string TakeFromLine(std::size_t count) override {
+    std::string taken;
+    char byte = 0;
+    while (taken.size() < count && ReadByte(device_, byte)) taken += byte;
+    return taken;
+  }
+  // A pseudo-terminal takes every setting and keeps few.
+  std::string LineSettings() override { return ""; }
+
+ private:
+  static bool ReadByte(int file, char& byte) {
+    pollfd wait = {file, POLLIN, 0};
+    return poll(&wait, 1, kLimitMs) == 1 && read(file, &byte, 1) == 1;
+  }
+
+  const std::string library_;
   int device_ = -1;
   int line_ = -1;
+  int input_ = -1;
   int output_ = -1;
   pid_t program_ = -1;
+  bool isSpeaking_ = true;  // the last byte that was asked for came
 };
 
-TEST_F(MinimalHostTest, PrintsThreeTokens) {
-  Start(PluginLibrary::DefaultPath(), kConfiguration);
-  ASSERT_EQ(OutputUntil("started"), "started\n");
-  const std::string bytes =
+TEST(MinimalHostTest, PrintsThreeTokens) {
+  TerminalSession host(PluginLibrary::DefaultPath());
+  ASSERT_EQ(host.StartForTokens(kConfiguration, 3), "started");
+  host.SendOnLine(
       "\x02"
       "AB\x03noise\x02"
       "CD\x03\x02"
-      "EF\x03";
-  ASSERT_EQ(write(device_, bytes.data(), bytes.size()), static_cast<ssize_t>(bytes.size()));
-  EXPECT_EQ(OutputUntil("EF"), "AB\nCD\nEF\n");
-  EXPECT_EQ(Status(), 0);
+      "EF\x03");
+  for (const char* token : {"AB", "CD", "EF"}) EXPECT_EQ(host.OutputLine(), token);
+  EXPECT_EQ(host.End(), 0);
 }
 
-TEST_F(MinimalHostTest, SaysWhyAConfigurationIsRefused) {
-  Start(PluginLibrary::DefaultPath(), "CfgVer=2");
-  EXPECT_EQ(OutputUntil("unknown format"), "Parser: unknown format\n");
-  EXPECT_EQ(Status(), 4);
+TEST(MinimalHostTest, SaysWhyAConfigurationIsRefused) {
+  TerminalSession host(PluginLibrary::DefaultPath());
+  EXPECT_EQ(host.Start("CfgVer=2"), "Parser: unknown format");
+  EXPECT_EQ(host.End(), 4);
 }
 
-TEST_F(MinimalHostTest, SaysWhyALibraryIsRefused) {
-  Start("/nonexistent.so", kConfiguration);
-  EXPECT_NE(OutputUntil("directory").find("/nonexistent.so"), std::string::npos);
-  EXPECT_EQ(Status(), 3);
+TEST(MinimalHostTest, SaysWhyALibraryIsRefused) {
+  TerminalSession host("/nonexistent.so");
+  EXPECT_NE(host.Start(kConfiguration).find("/nonexistent.so"), std::string::npos);
+  EXPECT_EQ(host.End(), 3);
 }
+
+class MinimalHostCheckTest : public ::testing::TestWithParam<HostCheck> {};
+
+TEST_P(MinimalHostCheckTest, AllSteps) {
+  TerminalSession host(PluginLibrary::DefaultPath());
+  EXPECT_EQ(Problems(GetParam(), host), "");
+}
+
+INSTANTIATE_TEST_SUITE_P(Checks, MinimalHostCheckTest, ::testing::ValuesIn(HostChecks()),
+                         [](const auto& test) { return test.param.name; });
 
 TEST(MinimalHostSourceTest, HasLessThan150Lines) {
   std::ifstream file(std::string(LOKA_SOURCE_DIR) + "/examples/minimal_host/MinimalHost.cpp");
