@@ -2,6 +2,7 @@
 #include "host/commands/CommandLine.h"
 
 #include <cerrno>
+#include <csignal>
 #include <cstdio>
 #include <cstring>
 #include <exception>
@@ -29,6 +30,8 @@ int StatusWithOutput(int status) {
 }  // namespace
 
 int RunCommandLine(int argumentCount, const char* const* arguments) {
+  // A file that has reached the limit of its size is an error like any other, not the end.
+  (void)std::signal(SIGXFSZ, SIG_IGN);
   try {
     CommandTree tree;
     int status = 0;

@@ -11,17 +11,18 @@
 #include <filesystem>
 #include <system_error>
 
+#include "host/base/SystemError.h"
+
 namespace fs = std::filesystem;
 
 namespace {
 
 constexpr int kBusyTimeoutMs = 2000;
+constexpr int kPrimaryCodeMask = 0xFF;  // of an extended result code
 // Marks the file as a store of this program ("loka" in ASCII).
 constexpr int kApplicationId = 0x6C6F6B61;
 
 enum ValueKind : int { kKindBoolean = 0, kKindInteger = 1, kKindText = 2 };
-
-std::string SystemErrorText() { return std::generic_category().message(errno); }
 
 // Makes the folder and those above it that are missing, for this user alone.
 bool MakeFolders(const fs::path& folder, std::string* error) {
@@ -33,7 +34,7 @@ bool MakeFolders(const fs::path& folder, std::string* error) {
     return false;
   }
   if (mkdir(folder.c_str(), S_IRWXU) != 0 && errno != EEXIST) {
-    *error = "cannot make the folder " + folder.string() + ": " + SystemErrorText();
+    *error = "cannot make the folder " + folder.string() + ": " + SystemErrorText(errno);
     return false;
   }
   return true;
@@ -44,11 +45,19 @@ bool MakeFolders(const fs::path& folder, std::string* error) {
 bool MakeFile(const std::string& path, std::string* error) {
   const int descriptor = open(path.c_str(), O_RDWR | O_CREAT | O_CLOEXEC, S_IRUSR | S_IWUSR);
   if (descriptor < 0) {
-    *error = "cannot open the store " + path + ": " + SystemErrorText();
+    *error = "cannot open the store " + path + ": " + SystemErrorText(errno);
     return false;
   }
   (void)close(descriptor);
   return true;
+}
+
+std::optional<SqliteFile::FileIdentity> FindFile(const std::string& path) {
+  struct stat status {};
+  if (stat(path.c_str(), &status) != 0) {
+    return std::nullopt;
+  }
+  return SqliteFile::FileIdentity(status.st_dev, status.st_ino);
 }
 
 bool BindText(sqlite3_stmt* statement, int column, const std::string& text) {
@@ -108,10 +117,23 @@ std::unique_ptr<SqliteFile> SqliteFile::Open(const std::string& path, std::strin
   }
   auto file = std::unique_ptr<SqliteFile>(new SqliteFile());
   file->path_ = path;
-  if (!file->Connect(path, error) || !file->CheckIsOurs(error) || !file->CreateTable(error)) {
+  if (!file->Connect(path, error) || !file->Check(error) || !file->Prepare(error)) {
     return nullptr;
   }
   return file;
+}
+
+// Where there is no room for the index that processes share, a process alone can still read.
+bool SqliteFile::Check(std::string* error) {
+  return CheckIsOurs(error) ||
+         (IsRoomMissing() && Connect(path_, error) &&
+          Execute("PRAGMA locking_mode = EXCLUSIVE", error) && CheckIsOurs(error));
+}
+
+// A store that is there is not written to: it must open on a full disk, too.
+bool SqliteFile::Prepare(std::string* error) {
+  return Execute("PRAGMA synchronous = FULL", error) && (!isNew_ || CreateTable(error)) &&
+         RememberFile(error);
 }
 
 bool SqliteFile::Connect(const std::string& path, std::string* error) {
@@ -142,8 +164,8 @@ bool SqliteFile::CheckIsOurs(std::string* error) {
              ") and was left as it is; move it away or choose another file";
     return false;
   }
-  const bool isNew = tables == "0" && applicationId == "0";
-  if (!isNew && applicationId != std::to_string(kApplicationId)) {
+  isNew_ = tables == "0" && applicationId == "0";
+  if (!isNew_ && applicationId != std::to_string(kApplicationId)) {
     *error = path_ + " is a database of another program and was left as it is; choose another file";
     return false;
   }
@@ -152,13 +174,35 @@ bool SqliteFile::CheckIsOurs(std::string* error) {
 
 bool SqliteFile::CreateTable(std::string* error) {
   const std::string mark = "PRAGMA application_id = " + std::to_string(kApplicationId);
-  return Execute("PRAGMA journal_mode = WAL", error) &&
-         Execute("PRAGMA synchronous = FULL", error) && Execute("BEGIN IMMEDIATE", error) &&
+  return Execute("PRAGMA journal_mode = WAL", error) && Execute("BEGIN IMMEDIATE", error) &&
          Execute(
              "CREATE TABLE IF NOT EXISTS setting (ident TEXT NOT NULL, key TEXT NOT NULL, "
              "kind INTEGER NOT NULL, value, PRIMARY KEY (ident, key)) WITHOUT ROWID",
              error) &&
          Execute(mark.c_str(), error) && Execute("COMMIT", error);
+}
+
+bool SqliteFile::RememberFile(std::string* error) {
+  file_ = FindFile(path_);
+  if (!file_) {
+    *error = "cannot open the store " + path_ + ": " + SystemErrorText(errno);
+  }
+  return file_.has_value();
+}
+
+// SQLite goes on with a file that has lost its name, and nobody would ever find what it stores
+// there.
+bool SqliteFile::IsInPlace(std::string* error) const {
+  if (FindFile(path_) == file_) {
+    return true;
+  }
+  *error = "the store " + path_ + " was moved or removed";
+  return false;
+}
+
+bool SqliteFile::IsRoomMissing() const {
+  const int code = sqlite3_extended_errcode(database_.get()) & kPrimaryCodeMask;
+  return code == SQLITE_FULL || code == SQLITE_IOERR || code == SQLITE_CANTOPEN;
 }
 
 bool SqliteFile::Execute(const char* sql, std::string* error) {
@@ -169,14 +213,14 @@ bool SqliteFile::Execute(const char* sql, std::string* error) {
   return false;
 }
 
-SqliteFile::Statement SqliteFile::Prepare(const char* sql) {
+SqliteFile::Statement SqliteFile::MakeStatement(const char* sql) {
   sqlite3_stmt* statement = nullptr;
   (void)sqlite3_prepare_v2(database_.get(), sql, -1, &statement, nullptr);
   return Statement(statement);
 }
 
 bool SqliteFile::QueryText(const char* sql, std::string* answer, std::string* error) {
-  const Statement statement = Prepare(sql);
+  const Statement statement = MakeStatement(sql);
   if (statement == nullptr || sqlite3_step(statement.get()) != SQLITE_ROW) {
     *error = LastErrorText();
     return false;
@@ -186,7 +230,7 @@ bool SqliteFile::QueryText(const char* sql, std::string* answer, std::string* er
 }
 
 bool SqliteFile::InsertAll(const Values& values) {
-  const Statement insert = Prepare(
+  const Statement insert = MakeStatement(
       "INSERT INTO setting (ident, key, kind, value) VALUES (?1, ?2, ?3, ?4) "
       "ON CONFLICT (ident, key) DO UPDATE SET kind = ?3, value = ?4");
   if (insert == nullptr) {
@@ -209,7 +253,7 @@ bool SqliteFile::Store(const Values& values, std::string* error) {
 
 bool SqliteFile::EndTransaction(bool isGood, std::string* error) {
   if (isGood && Execute("COMMIT", error)) {
-    return true;
+    return IsInPlace(error);
   }
   *error = LastErrorText();
   if (sqlite3_get_autocommit(database_.get()) == 0) {
@@ -219,7 +263,8 @@ bool SqliteFile::EndTransaction(bool isGood, std::string* error) {
 }
 
 std::optional<StoredValue> SqliteFile::Find(const StoredKey& key) {
-  const Statement query = Prepare("SELECT kind, value FROM setting WHERE ident = ?1 AND key = ?2");
+  const Statement query =
+      MakeStatement("SELECT kind, value FROM setting WHERE ident = ?1 AND key = ?2");
   if (query == nullptr || !BindText(query.get(), 1, key.first) ||
       !BindText(query.get(), 2, key.second) || sqlite3_step(query.get()) != SQLITE_ROW) {
     return std::nullopt;
@@ -229,7 +274,7 @@ std::optional<StoredValue> SqliteFile::Find(const StoredKey& key) {
 
 SqliteFile::Values SqliteFile::All(const std::string& ident) {
   Values values;
-  const Statement query = Prepare("SELECT key, kind, value FROM setting WHERE ident = ?1");
+  const Statement query = MakeStatement("SELECT key, kind, value FROM setting WHERE ident = ?1");
   if (query != nullptr && BindText(query.get(), 1, ident)) {
     while (sqlite3_step(query.get()) == SQLITE_ROW) {
       values[{ident, ColumnText(query.get(), 0)}] = ColumnValue(query.get(), 1, 2);
@@ -239,7 +284,7 @@ SqliteFile::Values SqliteFile::All(const std::string& ident) {
 }
 
 bool SqliteFile::ReadAll(Values* values, std::string* error) {
-  const Statement query = Prepare("SELECT ident, key, kind, value FROM setting");
+  const Statement query = MakeStatement("SELECT ident, key, kind, value FROM setting");
   int result = query == nullptr ? SQLITE_ERROR : sqlite3_step(query.get());
   for (; result == SQLITE_ROW; result = sqlite3_step(query.get())) {
     (*values)[{ColumnText(query.get(), 0), ColumnText(query.get(), 1)}] =
@@ -252,7 +297,7 @@ bool SqliteFile::ReadAll(Values* values, std::string* error) {
 }
 
 bool SqliteFile::DeleteAll(const std::vector<StoredKey>& keys) {
-  const Statement remove = Prepare("DELETE FROM setting WHERE ident = ?1 AND key = ?2");
+  const Statement remove = MakeStatement("DELETE FROM setting WHERE ident = ?1 AND key = ?2");
   if (remove == nullptr) {
     return false;
   }
@@ -267,7 +312,6 @@ bool SqliteFile::Remove(const std::vector<StoredKey>& keys, std::string* error) 
 }
 
 std::string SqliteFile::LastErrorText() const {
-  constexpr int kPrimaryCodeMask = 0xFF;
   const std::string store = "the store " + path_;
   switch (sqlite3_extended_errcode(database_.get()) & kPrimaryCodeMask) {
     case SQLITE_FULL:
@@ -281,6 +325,12 @@ std::string SqliteFile::LastErrorText() const {
     case SQLITE_CORRUPT:
       return store + " is damaged or not a store (" + sqlite3_errmsg(database_.get()) +
              ") and was left as it is; move it away or choose another file";
+    case SQLITE_IOERR:
+    case SQLITE_CANTOPEN: {
+      const int systemError = sqlite3_system_errno(database_.get());
+      return store + ": " + sqlite3_errmsg(database_.get()) +
+             (systemError == 0 ? "" : " (" + SystemErrorText(systemError) + ")");
+    }
     default:
       return store + ": " + sqlite3_errmsg(database_.get());
   }

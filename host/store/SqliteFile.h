@@ -1,10 +1,12 @@
 // SPDX-License-Identifier: Apache-2.0
 #pragma once
 
+#include <cstdint>
 #include <map>
 #include <memory>
 #include <optional>
 #include <string>
+#include <utility>
 #include <vector>
 
 #include "host/store/StoredValue.h"
@@ -18,6 +20,8 @@ struct sqlite3_stmt;
 class SqliteFile {
  public:
   using Values = std::map<StoredKey, StoredValue>;
+  // Device and number of a file: tells whether its name still leads to it.
+  using FileIdentity = std::pair<std::uint64_t, std::uint64_t>;
 
   // Whether this program has a store at all (LOKA_WITH_STORE).
   static bool IsBuiltIn();
@@ -33,7 +37,8 @@ class SqliteFile {
   SqliteFile& operator=(const SqliteFile&) = delete;
 
   // Stores all values in one transaction, all of them or none. False, with the reason in `error`,
-  // when nothing was stored. Waits up to 2000 ms for another process to let go of the file.
+  // when nothing was stored, or when the file was moved away meanwhile, so that nobody would find
+  // it. Waits up to 2000 ms for another process to let go of the file.
   bool Store(const Values& values, std::string* error);
 
   // The stored value, or nothing.
@@ -62,16 +67,23 @@ class SqliteFile {
   SqliteFile() = default;
 
   bool Connect(const std::string& path, std::string* error);
+  bool Check(std::string* error);
+  bool Prepare(std::string* error);
+  bool RememberFile(std::string* error);
+  bool IsInPlace(std::string* error) const;
+  bool IsRoomMissing() const;
   bool CheckIsOurs(std::string* error);
   bool CreateTable(std::string* error);
   bool Execute(const char* sql, std::string* error);
   bool InsertAll(const Values& values);
   bool DeleteAll(const std::vector<StoredKey>& keys);
   bool EndTransaction(bool isGood, std::string* error);
-  Statement Prepare(const char* sql);
+  Statement MakeStatement(const char* sql);
   bool QueryText(const char* sql, std::string* answer, std::string* error);
   std::string LastErrorText() const;
 
   std::string path_;
+  std::optional<FileIdentity> file_;
+  bool isNew_ = false;
   std::unique_ptr<sqlite3, DatabaseCloser> database_;
 };

@@ -1,6 +1,9 @@
 // SPDX-License-Identifier: Apache-2.0
 #pragma once
 
+#include <unistd.h>
+
+#include <filesystem>
 #include <memory>
 #include <nlohmann/json.hpp>
 #include <stdexcept>
@@ -52,6 +55,15 @@ class RunBench {
   std::unique_ptr<ProgramRun> Command(const std::vector<std::string>& arguments,
                                       const std::string& wrapper = "") const {
     return std::make_unique<ProgramRun>(arguments, Environment(wrapper));
+  }
+
+  // From now on another user runs the commands here.
+  void GiveTo(unsigned int userId) const {
+    namespace fs = std::filesystem;
+    (void)!chown(folder_.Path().c_str(), userId, userId);
+    for (const auto& entry : fs::recursive_directory_iterator(folder_.Path())) {
+      (void)!chown(entry.path().c_str(), userId, userId);
+    }
   }
 
   // A number that the running instance counts, as "tokens" or "drops/no-suffix"; 0 when there is
