@@ -104,9 +104,11 @@ void EventPrinter::PrintToken(const HostEvent& event, const TokenReceived& token
       WriteLine(event, HexBytes(token.bytes));
       break;
     case PrintOptions::Form::kDump:
-      WriteLine(event, "rx " + (token.frame.empty() ? HexDump(token.bytes)
-                                                    : HexDump(token.frame, token.prefixBytes,
-                                                              token.suffixBytes, style_)));
+      WriteLine(event,
+                "rx " + (token.frame.empty()
+                             ? HexDump(token.bytes)
+                             : HexDump(token.frame, static_cast<std::size_t>(token.prefixBytes),
+                                       static_cast<std::size_t>(token.suffixBytes), style_)));
       break;
     case PrintOptions::Form::kFormat:
       WriteLine(event, options_.format.Write(event));
