@@ -3,6 +3,7 @@
 // and stop. Meant for the thread sanitizer; without it the order of tokens and the host's rules are
 // still checked.
 #include <atomic>
+#include <chrono>
 #include <functional>
 #include <thread>
 #include <vector>
@@ -191,6 +192,23 @@ TEST_F(ConcurrencyTest, StartAndStopFromSeveralThreads) {
                   P().ComParams();
                 }});
   P()->Stop();
+}
+
+// A start that found the driver still started would answer 1 for a driver that stops.
+TEST_F(ConcurrencyTest, AStartInTheMiddleOfAStopWaitsForItsEnd) {
+  constexpr auto kTimeForAWrongAnswer = std::chrono::milliseconds(100);
+  ASSERT_TRUE(P().Config(Mandatory("rx_suffix=03")));
+  ASSERT_NE(P()->Start(), 0);
+  std::thread starter;
+  host_.MultiTask().OnNextStop([&] {
+    starter = std::thread([&] { EXPECT_NE(P()->Start(), 0); });
+    std::this_thread::sleep_for(kTimeForAWrongAnswer);
+  });
+  EXPECT_NE(P()->Stop(), 0);
+  ASSERT_TRUE(starter.joinable());
+  starter.join();
+  EXPECT_TRUE(host_.MultiTask().LastTask()->IsStarted());
+  EXPECT_FALSE(host_.MultiTask().LastTask()->IsAskedToEnd());
 }
 
 TEST_F(ConcurrencyTest, TagsComeAndGoWhileTheTaskRuns) {

@@ -21,12 +21,15 @@ void ScriptedMultiTask::reserved12() { log_.AddViolation("a reserved task operat
 int ScriptedMultiTask::StopTask(ITask* task, int timeoutMs) {
   const HostCall inside;
   ScriptedTask* known = nullptr;
+  std::function<void()> action;
   {
     const std::lock_guard<std::mutex> guard(mutex_);
     for (const auto& candidate : tasks_) {
       if (candidate.get() == task) known = candidate.get();
     }
+    action = std::exchange(onNextStop_, nullptr);
   }
+  if (action) action();
   if (known == nullptr || known->IsEnded()) {
     log_.AddViolation("StopTask of a task that is not there");
     return 0;
@@ -100,6 +103,11 @@ ITask* ScriptedMultiTask::CreateTask(ITaskRunner* runner, int taskClass) {
 void ScriptedMultiTask::OnSleep(std::function<void(int)> action) {
   const std::lock_guard<std::mutex> guard(mutex_);
   onSleep_ = std::move(action);
+}
+
+void ScriptedMultiTask::OnNextStop(std::function<void()> action) {
+  const std::lock_guard<std::mutex> guard(mutex_);
+  onNextStop_ = std::move(action);
 }
 
 ScriptedTask* ScriptedMultiTask::LastTask() {

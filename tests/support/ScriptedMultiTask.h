@@ -37,6 +37,8 @@ class ScriptedMultiTask final : public IMultiTask2 {
 
   // Runs on the sleeping thread inside every Sleep of the receive task, to act between two passes.
   void OnSleep(std::function<void(int milliseconds)> action);
+  // Runs on the stopping thread inside the next StopTask, in front of the task\'s end.
+  void OnNextStop(std::function<void()> action);
 
   ScriptedTask* LastTask();
   ScriptedSemaphore* Semaphore(const std::string& name);
@@ -50,6 +52,7 @@ class ScriptedMultiTask final : public IMultiTask2 {
   bool threaded_ = false;
   mutable std::mutex mutex_;
   std::function<void(int)> onSleep_;
+  std::function<void()> onNextStop_;
   int createdSemaphores_ = 0;
   std::vector<std::unique_ptr<ScriptedSemaphore>> semaphores_;
   std::vector<std::unique_ptr<ScriptedTask>> tasks_;
