@@ -36,36 +36,39 @@ install_kernel() {
   done
 }
 
-# install_program FILE: into /opt, with the shared libraries that it needs.
+# install_program ABI FILE: with the shared libraries that it needs. The kernel runs programs of both
+# ABIs; those for armel and their libraries have a folder of their own.
 install_program() {
-  local triplet
-  triplet=$(panel_triplet armhf)
-  mkdir -p "$panel_root/opt"
-  "$triplet-strip" -o "$panel_root/opt/${1##*/}" "$1"
-  install_libraries_of "$1"
+  local abi=$1 prefix=$panel_root
+  [ "$abi" = armhf ] || prefix=$panel_root/$abi
+  mkdir -p "$prefix/opt" "$prefix/lib" "$panel_root/lib"
+  "$(panel_triplet "$abi")-strip" -o "$prefix/opt/${2##*/}" "$2"
+  install_libraries_of "$abi" "$prefix/lib" "$2"
 }
 
+# install_libraries_of ABI FOLDER FILE. A program names its loader with the path, so that is /lib.
 install_libraries_of() {
-  local triplet library folder
-  triplet=$(panel_triplet armhf)
-  mkdir -p "$panel_root/lib"
-  for library in $("$triplet-readelf" -d "$1" | sed -n 's/.*(NEEDED).*\[\(.*\)\].*/\1/p') \
-    ld-linux-armhf.so.3; do
-    [ ! -e "$panel_root/lib/$library" ] || continue
-    for folder in "/usr/$triplet/lib" "$(panel_build_dir armhf)/target/usr/lib/$triplet" \
-      "$(panel_build_dir armhf)/target/lib/$triplet"; do
+  local abi=$1 destination=$2 triplet library folder
+  triplet=$(panel_triplet "$abi")
+  for library in $("$triplet-readelf" -d "$3" | sed -n 's/.*(NEEDED).*\[\(.*\)\].*/\1/p') \
+    $("$triplet-readelf" -l "$3" | sed -n 's|.*interpreter: /lib/\(.*\)].*|\1|p'); do
+    [ ! -e "$destination/$library" ] || continue
+    for folder in "/usr/$triplet/lib" "$(panel_build_dir "$abi")/target/usr/lib/$triplet" \
+      "$(panel_build_dir "$abi")/target/lib/$triplet"; do
       [ -e "$folder/$library" ] || continue
-      cp -L "$folder/$library" "$panel_root/lib/$library"
-      install_libraries_of "$folder/$library"
+      cp -L "$folder/$library" "$destination/$library"
+      install_libraries_of "$abi" "$destination" "$folder/$library"
       break
     done
-    [ -e "$panel_root/lib/$library" ] || die "no $library for the panel"
+    [ -e "$destination/$library" ] || die "no $library for the panel"
+    case $library in ld-linux*) [ -e "$panel_root/lib/$library" ] ||
+      cp "$destination/$library" "$panel_root/lib/" ;; esac
   done
 }
 
-# make_image PROGRAM...: everything, packed.
+# make_image: everything, packed. The libraries are those of the archives.
 make_image() {
-  local program
+  local abi program
   say "Making the panel's image"
   rm -rf "$panel_root"
   mkdir -p "$panel_root"/{bin,dev,proc,sys,tmp,run,data}
@@ -75,7 +78,14 @@ make_image() {
   ln -s busybox "$panel_root/bin/sh"
   cp "$project_dir/scripts/panel/init" "$panel_root/init"
   install_kernel
-  for program in "$@"; do install_program "$program"; done
+  for abi in "${panel_abis[@]}"; do
+    for program in libLOKA.so minimal_host; do
+      install_program "$abi" "$panel_image/archive/$abi/$program"
+    done
+  done
+  for program in loka plugin_tests arm_difference_tests line_settings; do
+    install_program armhf "$(panel_build_dir armhf)/$program"
+  done
   # A plug-in test compares the library's description with its source.
   mkdir -p "$panel_root$project_dir/driver"
   cp "$project_dir/driver/Xml_LOKA.xml" "$panel_root$project_dir/driver/"

@@ -13,18 +13,22 @@ say "Building the library, the reference host and the tests for the panel"
 cmake -S "$project_dir" --preset panel-armhf -DLOKA_BUILD_TESTS=ON -DLOKA_BUILD_HOST=ON \
   "${panel_host_options[@]}" >/dev/null
 cmake --build "$(panel_build_dir armhf)" \
-  --target LOKA loka plugin_tests arm_difference_tests minimal_host line_settings
+  --target LOKA loka plugin_tests arm_difference_tests line_settings
+build panel-armel LOKA
 build release emulated_panel_tests
 
-# The library under test is the one that ships.
-make_archive armhf
+# What is under test is what ships: the libraries, and the minimal host made of the archive's sources.
 rm -rf "$panel_image/archive"
-mkdir -p "$panel_image/archive"
-tar -xzf "$(archive_file armhf)" -C "$panel_image/archive" --strip-components=1
-(cd "$panel_image/archive" && sha256sum --quiet -c SHA256SUMS)
-build_dir=$(panel_build_dir armhf)
-make_image "$panel_image/archive/libLOKA.so" "$build_dir"/{loka,plugin_tests,arm_difference_tests} \
-  "$build_dir"/{minimal_host,line_settings}
+for abi in "${panel_abis[@]}"; do
+  make_archive "$abi"
+  mkdir -p "$panel_image/archive/$abi"
+  tar -xzf "$(archive_file "$abi")" -C "$panel_image/archive/$abi" --strip-components=1
+  (cd "$panel_image/archive/$abi" && sha256sum --quiet -c SHA256SUMS)
+  "$(panel_triplet "$abi")-g++" -std=c++17 -O2 -Wall -Wextra -Wno-psabi -pthread \
+    -I "$panel_image/archive/$abi" -o "$panel_image/archive/$abi/minimal_host" \
+    "$panel_image/archive/$abi/examples/MinimalHost.cpp"
+done
+make_image
 rm -f "$panel_image/disk"
 truncate -s 16M "$panel_image/disk"
 /sbin/mkfs.ext4 -q "$panel_image/disk"
