@@ -49,13 +49,18 @@ std::string fromHex(const std::string& text) {
 }
 
 std::string ToHex(std::string_view bytes) {
-  constexpr const char* kDigits = "0123456789ABCDEF";
   std::string text;
-  text.reserve(bytes.size() * 2);
+  ToHex(bytes, text);
+  return text;
+}
+
+void ToHex(std::string_view bytes, std::string& text) {
+  constexpr const char* kDigits = "0123456789ABCDEF";
+  text.resize(bytes.size() * 2);
+  std::size_t place = 0;
   for (const char c : bytes) {
     const auto byte = static_cast<unsigned char>(c);
-    text.push_back(kDigits[byte >> 4U]);
-    text.push_back(kDigits[byte & 0x0FU]);
+    text[place++] = kDigits[byte >> 4U];
+    text[place++] = kDigits[byte & 0x0FU];
   }
-  return text;
 }

@@ -16,5 +16,6 @@ bool isHex(const char* text);
 // counts 169. Text that comes from outside goes through isHex first.
 std::string fromHex(const std::string& text);
 
-// Two upper-case digits a byte.
+// Two upper-case digits a byte. The second form replaces what `text` holds and reuses its memory.
 std::string ToHex(std::string_view bytes);
+void ToHex(std::string_view bytes, std::string& text);

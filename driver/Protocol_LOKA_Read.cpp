@@ -147,15 +147,19 @@ bool Protocol_LOKA::ReadTokenType(const Tag_LOKA& tag, ReadTarget target) {
 
 // The oldest token up to its first zero byte; it stays queued. Without a token, an empty text.
 bool Protocol_LOKA::ReadToken(const Tag_LOKA& tag, ReadTarget target) {
-  if (tokens_.Count() == 0) {
-    target.PutByte(0);
+  const bool fits = tokens_.WithFront([&](const std::string* token) {
+    if (token == nullptr) {
+      target.PutByte(0);
+      return true;
+    }
+    if (static_cast<long long>(token->size()) >= tag.GetVarLength()) {
+      return false;
+    }
+    target.PutText(*token);
     return true;
-  }
-  const std::string token = tokens_.Front();
-  if (static_cast<long long>(token.size()) >= tag.GetVarLength()) {
+  });
+  if (!fits) {
     SetError(kGeneralError, Texts_LOKA::kTokenTooLong);
-    return false;
   }
-  target.PutText(token);
-  return true;
+  return fits;
 }

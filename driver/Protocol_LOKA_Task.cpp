@@ -1,5 +1,4 @@
 // SPDX-License-Identifier: Apache-2.0
-#include "driver/HexText.h"
 #include "driver/Protocol_LOKA.h"
 #include "interfaces/IMultiTask2.h"
 #include "protlib/SemaphoreLock.h"
@@ -69,6 +68,9 @@ void Protocol_LOKA::QueueToken(std::string_view token) {
 
 // The caller holds the queue semaphore.
 void Protocol_LOKA::addToken(std::string_view token) {
-  tokens_.Push(settings_.HexTokens() ? ToHex(token) : std::string(token),
-               settings_.TokenQueueSize());
+  if (settings_.HexTokens()) {
+    tokens_.PushHex(token, settings_.TokenQueueSize());
+  } else {
+    tokens_.Push(token, settings_.TokenQueueSize());
+  }
 }

@@ -1,8 +1,9 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "driver/SerialLink.h"
 
+#include <iterator>
+
 #include "interfaces/ISerialFactory.h"
-#include "interfaces/ISerialPort.h"
 
 namespace {
 
@@ -90,24 +91,10 @@ bool SerialLink::Send(const std::string& bytes) {
   return true;
 }
 
-SerialLink::ReceiveResult SerialLink::Receive(unsigned char& byte, int timeoutMs) {
-  ISerialPort* port = connected_ ? port_.load() : nullptr;
-  if (port == nullptr) {
-    return ReceiveResult::kClosed;
-  }
-  return port->Receive(&byte, timeoutMs, 0) != 0 ? ReceiveResult::kByte : ReceiveResult::kTimeout;
-}
-
-void SerialLink::BeginPass() {
-  const LeafLock lock(passMutex_);
-  isPassRunning_ = true;
-}
-
-void SerialLink::EndPass() {
+void SerialLink::ReleaseKeptPorts() {
   Ports ports;
   {
     const LeafLock lock(passMutex_);
-    isPassRunning_ = false;
     ports.swap(releaseAfterPass_);
   }
   for (ISerialPort* port : ports) {
@@ -118,12 +105,15 @@ void SerialLink::EndPass() {
 // Leaves the port to the receive pass that is running. False when none is.
 bool SerialLink::KeepForPass(ISerialPort* port) {
   const LeafLock lock(passMutex_);
-  if (!isPassRunning_) {
-    return false;
-  }
   places_.front() = port;
   releaseAfterPass_.splice(releaseAfterPass_.end(), places_, places_.begin());
-  return true;
+  PassState state = PassState::kRunning;
+  if (pass_.compare_exchange_strong(state, PassState::kRunningWithPorts) ||
+      state == PassState::kRunningWithPorts) {
+    return true;
+  }
+  places_.splice(places_.begin(), releaseAfterPass_, std::prev(releaseAfterPass_.end()));
+  return false;
 }
 
 // Gives up the place of a port that is not kept.

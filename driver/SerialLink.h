@@ -6,10 +6,10 @@
 #include <string>
 
 #include "driver/SerialSettings.h"
+#include "interfaces/ISerialPort.h"
 #include "protlib/LeafMutex.h"
 
 class ISerialFactory;
-class ISerialPort;
 
 // The protocol's serial port, open or closed. Opening and closing belong under the host's port
 // semaphore, and so does each received byte, so that a port is not released while the receive task
@@ -53,13 +53,23 @@ class SerialLink {
 
   // Waits for one byte, unless the link is closed. Only within a ReceivePass and under the port
   // semaphore.
-  ReceiveResult Receive(unsigned char& byte, int timeoutMs);
+  ReceiveResult Receive(unsigned char& byte, int timeoutMs) {
+    ISerialPort* port = connected_ ? port_.load() : nullptr;
+    if (port == nullptr) {
+      return ReceiveResult::kClosed;
+    }
+    return port->Receive(&byte, timeoutMs, 0) != 0 ? ReceiveResult::kByte : ReceiveResult::kTimeout;
+  }
 
   // Marks one receive pass of the receive task.
   class ReceivePass {
    public:
-    explicit ReceivePass(SerialLink& link) : link_(link) { link_.BeginPass(); }
-    ~ReceivePass() { link_.EndPass(); }
+    explicit ReceivePass(SerialLink& link) : link_(link) { link_.pass_ = PassState::kRunning; }
+    ~ReceivePass() {
+      if (link_.pass_.exchange(PassState::kNone) == PassState::kRunningWithPorts) {
+        link_.ReleaseKeptPorts();
+      }
+    }
     ReceivePass(const ReceivePass&) = delete;
     ReceivePass& operator=(const ReceivePass&) = delete;
 
@@ -70,9 +80,10 @@ class SerialLink {
  private:
   using Ports = std::list<ISerialPort*>;
 
+  enum class PassState { kNone, kRunning, kRunningWithPorts };
+
   ISerialPort* TakePort();
-  void BeginPass();
-  void EndPass();
+  void ReleaseKeptPorts();
   bool KeepForPass(ISerialPort* port);
   void DropPlace();
   void Release(ISerialPort* port);
@@ -86,8 +97,11 @@ class SerialLink {
   LeafMutex useMutex_{LockRank::kPortUse};
   std::atomic<ISerialPort*> port_{nullptr};  // written under useMutex_, read by the receive task
 
+  // Each begin and end of a pass is one atomic step: a pass that begins sees that the port is gone,
+  // or whoever has taken the port sees the pass. kRunningWithPorts is set under passMutex_.
+  std::atomic<PassState> pass_{PassState::kNone};
+
   LeafMutex passMutex_;
-  bool isPassRunning_ LOKA_GUARDED_BY(passMutex_) = false;
   Ports releaseAfterPass_ LOKA_GUARDED_BY(passMutex_);
   // One for each open port, made when it is opened: to keep a port for the pass needs no memory.
   Ports places_ LOKA_GUARDED_BY(passMutex_);

@@ -1,86 +1,91 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "driver/TokenFramer.h"
 
+#include <algorithm>
+#include <cstring>
+
+namespace {
+
+constexpr std::size_t kStorageBytesAtFirst = 2048;  // more than a frame may have
+
+}  // namespace
+
 void TokenFramer::Begin(const RxFraming& framing) {
-  framing_ = &framing;
-  gathered_.clear();
+  prefix_ = framing.prefix;
+  suffix_ = framing.suffix;
+  const std::string_view mark = suffix_.empty() ? prefix_ : suffix_;
+  hasEnd_ = !mark.empty();
+  endByte_ = hasEnd_ ? static_cast<unsigned char>(mark.back()) : 0;
   matched_ = 0;
-  count_ = framing.prefix.size();
-  restartAtPrefix_ = false;
+  begin_ = 0;
+  end_ = 0;
   token_ = {};
 }
 
-TokenFramer::Result TokenFramer::OnByte(unsigned char byte) {
-  const char character = static_cast<char>(byte);
-  if (matched_ < framing_->prefix.size()) {
-    MatchPrefix(character);
-    return Result::kMore;
+// Moves what is gathered to the front, into more memory when that alone makes no room.
+void TokenFramer::MakeRoom() {
+  const std::size_t gathered = GatheredBytes();
+  if (storage_.size() < 2 * gathered || storage_.empty()) {
+    std::vector<char> larger(std::max(kStorageBytesAtFirst, 2 * storage_.size()));
+    std::copy_n(storage_.begin() + static_cast<std::ptrdiff_t>(begin_), gathered, larger.begin());
+    storage_.swap(larger);
+  } else {
+    std::memmove(storage_.data(), storage_.data() + begin_, gathered);
   }
-  if (restartAtPrefix_) {
-    gathered_ = framing_->prefix;
-    restartAtPrefix_ = false;
-  }
-  return OnBodyByte(character);
+  begin_ = 0;
+  end_ = gathered;
 }
 
 // A byte that does not fit starts the match again at itself; bytes before it are not looked at
 // again.
-void TokenFramer::MatchPrefix(char byte) {
-  const std::string& prefix = framing_->prefix;
-  if (byte != prefix[matched_]) {
-    gathered_.clear();
+void TokenFramer::MatchPrefix(unsigned char byte) {
+  const char character = static_cast<char>(byte);
+  if (character != prefix_[matched_]) {
+    end_ = begin_;
     matched_ = 0;
-    if (byte != prefix[0]) {
+    if (character != prefix_.front()) {
       return;
     }
   }
-  gathered_.push_back(byte);
+  Append(byte);
   ++matched_;
 }
 
-TokenFramer::Result TokenFramer::OnBodyByte(char byte) {
-  const std::string& prefix = framing_->prefix;
-  const std::string& suffix = framing_->suffix;
-  gathered_.push_back(byte);
-  ++count_;
-  if (count_ >= prefix.size() + suffix.size()) {
-    if (!suffix.empty() && EndsWith(suffix)) {
-      token_ = Cut(suffix.size());
+// Suffix and prefix do not share bytes: a suffix that begins within the prefix is none.
+TokenFramer::Result TokenFramer::OnEndByte() {
+  if (!suffix_.empty()) {
+    if (GatheredBytes() >= prefix_.size() + suffix_.size() && EndsWith(suffix_)) {
+      token_ = Cut(suffix_.size());
       return Result::kToken;
     }
-    if (suffix.empty() && !prefix.empty() && EndsWith(prefix)) {
-      token_ = Cut(prefix.size());
-      restartAtPrefix_ = true;
-      // The next token begins with its prefix gathered, which may be too much by itself.
-      return prefix.size() > kMaxGatheredBytes ? Result::kToken : Result::kTokenAndMore;
-    }
+  } else if (EndsWith(prefix_)) {
+    token_ = Cut(prefix_.size());
+    begin_ = end_ - prefix_.size();
+    // The next token begins with its prefix gathered, which may be too much by itself.
+    return prefix_.size() > kMaxGatheredBytes ? Result::kToken : Result::kTokenAndMore;
   }
-  return gathered_.size() > kMaxGatheredBytes ? Result::kDropped : Result::kMore;
+  return GatheredBytes() > kMaxGatheredBytes ? Result::kDropped : Result::kMore;
 }
 
 bool TokenFramer::OnSilence() {
-  const std::size_t prefixBytes = framing_->prefix.size();
-  if (restartAtPrefix_ || matched_ < prefixBytes || !framing_->suffix.empty() ||
-      gathered_.size() <= prefixBytes) {
+  if (matched_ < prefix_.size() || !suffix_.empty() || GatheredBytes() <= prefix_.size()) {
     return false;
   }
   token_ = Cut(0);
   return true;
 }
 
-bool TokenFramer::EndsWith(const std::string& mark) const {
-  // The last byte decides most of the time.
-  return gathered_.back() == mark.back() && gathered_.size() >= mark.size() &&
-         gathered_.compare(gathered_.size() - mark.size(), mark.size(), mark) == 0;
+bool TokenFramer::EndsWith(std::string_view mark) const {
+  return GatheredBytes() >= mark.size() &&
+         std::memcmp(storage_.data() + end_ - mark.size(), mark.data(), mark.size()) == 0;
 }
 
 // What lies between the prefix and the last `behindBytes` bytes. Framing marks may overlap (prefix
 // 0202 in 02 02 02): the token is empty then.
 std::string_view TokenFramer::Cut(std::size_t behindBytes) const {
-  const std::size_t framingBytes = framing_->prefix.size() + behindBytes;
-  if (gathered_.size() <= framingBytes) {
+  const std::size_t framingBytes = prefix_.size() + behindBytes;
+  if (GatheredBytes() <= framingBytes) {
     return {};
   }
-  return std::string_view(gathered_).substr(framing_->prefix.size(),
-                                            gathered_.size() - framingBytes);
+  return {storage_.data() + begin_ + prefix_.size(), GatheredBytes() - framingBytes};
 }

@@ -4,6 +4,7 @@
 #include <cstddef>
 #include <string>
 #include <string_view>
+#include <vector>
 
 // What a received byte stream is cut by; empty texts are not used.
 struct RxFraming {
@@ -35,7 +36,18 @@ class TokenFramer {
   void Begin(const RxFraming& framing);
 
   // Takes one byte. Throws std::bad_alloc.
-  Result OnByte(unsigned char byte);
+  Result OnByte(unsigned char byte) {
+    if (matched_ < prefix_.size()) {
+      MatchPrefix(byte);
+      return Result::kMore;
+    }
+    Append(byte);
+    // The last byte of what ends a token decides most of the time.
+    if (byte == endByte_ && hasEnd_) {
+      return OnEndByte();
+    }
+    return GatheredBytes() > kMaxGatheredBytes ? Result::kDropped : Result::kMore;
+  }
 
   // Takes a silence, which ends the pass. True when it made a token.
   bool OnSilence();
@@ -45,15 +57,31 @@ class TokenFramer {
   std::string_view Token() const { return token_; }
 
  private:
-  void MatchPrefix(char byte);
-  Result OnBodyByte(char byte);
-  bool EndsWith(const std::string& mark) const;
+  void Append(unsigned char byte) {
+    if (end_ == storage_.size()) {
+      MakeRoom();
+    }
+    storage_[end_++] = static_cast<char>(byte);
+  }
+  std::size_t GatheredBytes() const { return end_ - begin_; }
+
+  void MakeRoom();
+  void MatchPrefix(unsigned char byte);
+  Result OnEndByte();
+  bool EndsWith(std::string_view mark) const;
   std::string_view Cut(std::size_t behindBytes) const;
 
-  const RxFraming* framing_ = nullptr;
-  std::string gathered_;          // everything received and not dropped, framing included
-  std::size_t matched_ = 0;       // bytes of the prefix that have matched
-  std::size_t count_ = 0;         // bytes received since the pass began, prefix included
-  bool restartAtPrefix_ = false;  // the last byte completed the next token's prefix
+  // Of the framing.
+  std::string_view prefix_;
+  std::string_view suffix_;
+  bool hasEnd_ = false;  // a suffix, or else a prefix, ends tokens; this is its last byte
+  unsigned char endByte_ = 0;
+
+  std::size_t matched_ = 0;  // bytes of the prefix that have matched
+  // Everything received and not dropped, framing included, is storage_ from begin_ to end_. A token
+  // that is followed by the next one's prefix stays in front of begin_.
+  std::vector<char> storage_;
+  std::size_t begin_ = 0;
+  std::size_t end_ = 0;
   std::string_view token_;
 };

@@ -75,9 +75,16 @@ bool TagBase::Convert(const unsigned char* src, unsigned char* dst, bool toDevic
   if (src == nullptr || dst == nullptr || GetVarLength() < 0) {
     return false;
   }
+  constexpr std::size_t kWorkBytes = 256;
+  const int length = GetVarLength();
+  if (length <= static_cast<int>(kWorkBytes) && conversions_.empty() &&
+      !ProtUtilsN::IsBitType(GetVarType()) && PackedLen() == length) {
+    // Both forms are the same and need no memory, so that nothing can fail half-way.
+    std::memmove(dst, src, static_cast<std::size_t>(length));
+    return true;
+  }
   return NoThrow(false, [&] {
-    constexpr std::size_t kWorkBytes = 256;
-    WorkBuffer<kWorkBytes> work(std::max(GetVarLength(), PackedLen()));
+    WorkBuffer<kWorkBytes> work(std::max(length, PackedLen()));
     if (!work.IsValid()) {
       return false;
     }

@@ -3,6 +3,7 @@
 
 #include <array>
 #include <cstddef>
+#include <cstring>
 #include <memory>
 #include <new>
 
@@ -12,6 +13,7 @@
 template <std::size_t StackBytes>
 class WorkBuffer {
  public:
+  // NOLINTNEXTLINE(cppcoreguidelines-pro-type-member-init): see stack_
   explicit WorkBuffer(long long sizeBytes) {
     if (sizeBytes < 0) {
       return;
@@ -19,6 +21,7 @@ class WorkBuffer {
     const auto size = static_cast<unsigned long long>(sizeBytes);
     if (size <= StackBytes) {
       data_ = stack_.data();
+      std::memset(data_, 0, static_cast<std::size_t>(size));
     } else if (size <= static_cast<std::size_t>(-1) / 2) {
       heap_.reset(new (std::nothrow) unsigned char[static_cast<std::size_t>(size)]());
       data_ = heap_.get();
@@ -32,7 +35,7 @@ class WorkBuffer {
   unsigned char* Data() { return data_; }
 
  private:
-  std::array<unsigned char, StackBytes> stack_{};
+  std::array<unsigned char, StackBytes> stack_;  // filled as far as it is used
   std::unique_ptr<unsigned char[]> heap_;
   unsigned char* data_ = nullptr;
 };
