@@ -3,7 +3,6 @@
 
 #include <cstdint>
 #include <cstring>
-#include <vector>
 
 #include "host/store/StorageBatch.h"
 #include "interfaces/IProtocol.h"
@@ -45,26 +44,20 @@ bool HostTag::ReadNumber(unsigned int* value) const {
 
 bool HostTag::WriteNumber(unsigned int value) {
   const std::uint32_t number = value;
+  unsigned char bytes[sizeof number] = {};
   if (ValueBytes(tag_) == 1) {
-    return Write(std::string(1, static_cast<char>(static_cast<unsigned char>(value))));
+    bytes[0] = static_cast<unsigned char>(value);
+    return Write(bytes);
   }
-  std::string bytes(sizeof number, '\0');
-  std::memcpy(bytes.data(), &number, sizeof number);
+  std::memcpy(bytes, &number, sizeof number);
   return ValueBytes(tag_) == sizeof number && Write(bytes);
 }
 
 bool HostTag::ReadText(std::string* text) const {
-  // The driver ends a text with a zero byte within the tag; the byte more holds in any case.
-  std::vector<unsigned char> value(ValueBytes(tag_) + 1, 0);
-  if (protocol_->Read(tag_, value.data()) == 0) {
+  if (!ReadValue(text)) {
     return false;
   }
-  value.back() = 0;
-  std::size_t length = 0;
-  while (value[length] != 0) {
-    ++length;
-  }
-  text->assign(value.begin(), value.begin() + static_cast<std::ptrdiff_t>(length));
+  text->resize(std::strlen(text->c_str()));
   return true;
 }
 
@@ -77,12 +70,15 @@ bool HostTag::WriteText(const std::string& text) {
   return Write(value);
 }
 
-bool HostTag::ReadBytes(std::string* bytes) const {
-  std::vector<unsigned char> value(ValueBytes(tag_) + 1, 0);
-  if (protocol_->Read(tag_, value.data()) == 0) {
+bool HostTag::ReadBytes(std::string* bytes) const { return ReadValue(bytes); }
+
+// Reads into the text's own memory, so that reading again needs none.
+bool HostTag::ReadValue(std::string* value) const {
+  value->assign(ValueBytes(tag_), '\0');
+  if (protocol_->Read(tag_, reinterpret_cast<unsigned char*>(value->data())) == 0) {
+    value->clear();
     return false;
   }
-  bytes->assign(value.begin(), value.end() - 1);
   return true;
 }
 
@@ -91,12 +87,15 @@ bool HostTag::WriteBytes(const std::string& bytes) {
 }
 
 bool HostTag::Write(const std::string& value) {
-  const std::vector<unsigned char> bytes(value.begin(), value.end());
+  return Write(reinterpret_cast<const unsigned char*>(value.data()));
+}
+
+bool HostTag::Write(const unsigned char* value) {
   storeError_.clear();
   // Ends after the driver has let its semaphore go; only then is the disk touched. A failure to
   // store is told by the storage itself and does not undo what the driver did.
   StorageBatch batch(storage_);
-  const bool isWritten = protocol_->Write(tag_, bytes.data()) != 0;
+  const bool isWritten = protocol_->Write(tag_, value) != 0;
   (void)batch.End(&storeError_);
   return isWritten;
 }

@@ -47,7 +47,9 @@ class HostTag {
   const std::string& StoreError() const { return storeError_; }
 
  private:
+  bool ReadValue(std::string* value) const;
   bool Write(const std::string& value);
+  bool Write(const unsigned char* value);
 
   IProtocol* const protocol_;
   ITag* const tag_;

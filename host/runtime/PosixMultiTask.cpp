@@ -4,10 +4,29 @@
 #include <sched.h>
 
 #include <algorithm>
+#include <ctime>
 #include <new>
 
 #include "host/base/Deadline.h"
 #include "interfaces/CompareInterface.h"
+
+namespace {
+
+// Gives the processor away, but once a tick of the system's clock and thread at most: the kernel
+// shares processors out by itself, and between two ticks nobody is kept waiting for long.
+void YieldOnceATick() {
+  thread_local timespec lastYield{};
+  timespec now{};
+  (void)clock_gettime(CLOCK_MONOTONIC_COARSE, &now);
+  if (now.tv_nsec != lastYield.tv_nsec || now.tv_sec != lastYield.tv_sec) {
+    lastYield = now;
+    (void)sched_yield();
+  }
+}
+
+}  // namespace
+
+PosixMultiTask::PosixMultiTask() { PosixSemaphore::Prepare(); }
 
 PosixMultiTask::~PosixMultiTask() {
   for (const std::shared_ptr<PosixTask>& task : tasks_) {
@@ -64,7 +83,7 @@ void PosixMultiTask::DeleteSemaphore(ISemaphore* semaphore) {
 
 void PosixMultiTask::Sleep(int milliseconds) {
   if (milliseconds <= 0) {
-    (void)sched_yield();
+    YieldOnceATick();
   } else {
     Deadline::After(milliseconds).Sleep();
   }

@@ -13,7 +13,7 @@
 // does not know, or no longer knows, is refused instead of followed. Any thread.
 class PosixMultiTask final : public IMultiTask2 {
  public:
-  PosixMultiTask() = default;
+  PosixMultiTask();
 
   // Asks every task that is left to end, but does not wait (see EndTasks); frees the semaphores.
   ~PosixMultiTask() override;
@@ -39,7 +39,9 @@ class PosixMultiTask final : public IMultiTask2 {
   // Frees a semaphore. A pointer that is none of ours is ignored.
   void DeleteSemaphore(ISemaphore* semaphore) override;
 
-  // 0 or less gives the processor away once (sched_yield(2)); otherwise sleeps the whole time.
+  // 0 or less gives the processor away (sched_yield(2)), but only when the calling thread has not
+  // done so since the last tick of the system's clock (a few milliseconds), so that a task that
+  // yields between tokens pays next to nothing; otherwise sleeps the whole time.
   void Sleep(int milliseconds) override;
 
   void reserved10() override {}

@@ -2,6 +2,7 @@
 #include "host/runtime/PosixSemaphore.h"
 
 #include <linux/futex.h>
+#include <linux/membarrier.h>
 #include <sys/syscall.h>
 #include <unistd.h>
 
@@ -26,10 +27,40 @@ void FutexWake(const std::atomic<std::uint32_t>* word, std::uint32_t bit) {
                 bit);
 }
 
+constexpr std::uint32_t kEveryBit = FUTEX_BITSET_MATCH_ANY;
+
+bool RegisterBarrier() {
+  return syscall(SYS_membarrier, MEMBARRIER_CMD_REGISTER_PRIVATE_EXPEDITED, 0, 0) == 0;
+}
+
+// Whether the kernel orders memory accesses on all processors for us.
+bool HasBarrier() {
+  static const bool hasBarrier = RegisterBarrier();
+  return hasBarrier;
+}
+
+// Every thread of the process has behind it, in order, what stands in front of it in its code.
+void OrderEverywhere() { (void)syscall(SYS_membarrier, MEMBARRIER_CMD_PRIVATE_EXPEDITED, 0, 0); }
+
+// The other half of it, in the thread that is ordered: keeps the compiler from changing the order.
+void KeepOrder() { std::atomic_signal_fence(std::memory_order_seq_cst); }
+
+// A number of its own for each thread, never used again.
+std::uint32_t ThisThread() {
+  static std::atomic<std::uint32_t> lastThread{0};
+  thread_local std::uint32_t number = 0;
+  if (number == 0) {
+    number = lastThread.fetch_add(1) + 1;
+  }
+  return number;
+}
+
 static_assert(sizeof(std::atomic<std::uint32_t>) == sizeof(std::uint32_t),
               "the kernel waits on the number itself");
 
 }  // namespace
+
+void PosixSemaphore::Prepare() { (void)HasBarrier(); }
 
 void* PosixSemaphore::ConvertTo(const char* name) {
   const bool isOurs =
@@ -38,20 +69,93 @@ void* PosixSemaphore::ConvertTo(const char* name) {
 }
 
 int PosixSemaphore::Lock() {
-  const std::uint32_t ticket = nextTicket_.fetch_add(1);
+  const std::uint32_t thread = ThisThread();
+  if (!LockAsFavourite(thread)) {
+    AwaitTurn(nextTicket_.fetch_add(1));
+    EndFavour();
+    NoteTurn(thread);
+    isHeldByFavour_ = false;
+  }
+  return 1;
+}
+
+bool PosixSemaphore::LockAsFavourite(std::uint32_t thread) {
+  Favour* const favour = favourite_.load(std::memory_order_acquire);
+  if (favour == nullptr || favour->thread.load(std::memory_order_relaxed) != thread) {
+    return false;
+  }
+  favour->isHolding.store(1, std::memory_order_relaxed);
+  KeepOrder();
+  if (nextTicket_.load(std::memory_order_acquire) ==
+      favour->ticket.load(std::memory_order_relaxed)) {
+    isHeldByFavour_ = true;
+    return true;
+  }
+  // Somebody has drawn a number and may be waiting for this.
+  favour->isHolding.store(0, std::memory_order_release);
+  FutexWake(&favour->isHolding, kEveryBit);
+  return false;
+}
+
+void PosixSemaphore::AwaitTurn(std::uint32_t ticket) {
   for (;;) {
     const std::uint32_t serving = nowServing_.load();
     if (serving == ticket) {
-      return 1;
+      return;
     }
     FutexWait(&nowServing_, serving, WakeBit(ticket));
   }
 }
 
+// The caller has the ticket that is served. The favourite either sees that it was drawn, or has
+// said before that it holds the semaphore.
+void PosixSemaphore::EndFavour() {
+  Favour* const favour = favourite_.load();
+  if (favour == nullptr) {
+    return;
+  }
+  OrderEverywhere();
+  while (favour->isHolding.load(std::memory_order_acquire) != 0) {
+    FutexWait(&favour->isHolding, 1, kEveryBit);
+  }
+  favourite_.store(nullptr);
+  if (turnsToFavour_ < kMostTurnsToFavour) {
+    turnsToFavour_ *= 2;
+  }
+}
+
+void PosixSemaphore::NoteTurn(std::uint32_t thread) {
+  if (lastThread_ != thread) {
+    lastThread_ = thread;
+    turns_ = 0;
+  }
+  ++turns_;
+}
+
+// Makes the thread of the last turns the favourite. A number that is drawn from now on is served
+// behind its turn and ends the favour.
+void PosixSemaphore::Grant(std::uint32_t nextTicket) {
+  for (Favour& favour : favours_) {
+    const std::uint32_t thread = favour.thread.load(std::memory_order_relaxed);
+    if (thread == 0 || thread == lastThread_) {
+      favour.thread.store(lastThread_, std::memory_order_relaxed);
+      favour.ticket.store(nextTicket, std::memory_order_relaxed);
+      favourite_.store(&favour);
+      return;
+    }
+  }
+}
+
 int PosixSemaphore::Unlock() {
+  if (isHeldByFavour_) {
+    return UnlockAsFavourite();
+  }
   const std::uint32_t serving = nowServing_.load();
   if (nextTicket_.load() == serving) {
     return 0;
+  }
+  if (turns_ >= turnsToFavour_ && nextTicket_.load() == serving + 1 && HasBarrier()) {
+    Grant(serving + 1);
   }
   // Sequentially consistent on purpose: a thread that draws a number after the check below must see
   // the new turn, or it would sleep with nobody left to wake it.
@@ -62,4 +166,22 @@ int PosixSemaphore::Unlock() {
   return 1;
 }
 
-unsigned int PosixSemaphore::UserCount() const { return nextTicket_.load() - nowServing_.load(); }
+int PosixSemaphore::UnlockAsFavourite() {
+  Favour* const favour = favourite_.load(std::memory_order_relaxed);
+  if (favour == nullptr || favour->isHolding.load(std::memory_order_relaxed) == 0) {
+    return 0;
+  }
+  const std::uint32_t ticket = favour->ticket.load(std::memory_order_relaxed);
+  favour->isHolding.store(0, std::memory_order_release);
+  KeepOrder();
+  if (nextTicket_.load(std::memory_order_relaxed) != ticket) {
+    FutexWake(&favour->isHolding, kEveryBit);
+  }
+  return 1;
+}
+
+unsigned int PosixSemaphore::UserCount() const {
+  const Favour* const favour = favourite_.load();
+  return nextTicket_.load() - nowServing_.load() +
+         (favour == nullptr ? 0 : favour->isHolding.load());
+}

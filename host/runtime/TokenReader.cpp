@@ -7,7 +7,8 @@
 
 namespace {
 
-constexpr unsigned int kFirstRoomCharacters = 255;
+// The driver needs no memory of its own for a read up to this length.
+constexpr unsigned int kFirstRoomCharacters = 127;
 constexpr int kAttempts = 100;
 
 }  // namespace
@@ -69,27 +70,31 @@ bool TokenReader::MakeRoom(unsigned int lengthCharacters) {
   return tokenTag_ != nullptr;
 }
 
-// Reads length and text of the same token. A full queue may drop its oldest token in between, so
-// the length is asked for again and both are read anew when it has changed.
+// Reads text and length of the same token. A text that is as long as the length belongs to it; when
+// it is not, the token has a zero byte in it or the text did not fit the tag, or a full queue has
+// dropped its oldest token in between. So both are then read until the length stays the same.
 bool TokenReader::ReadStable(std::string* text, unsigned int* length) {
+  if (!MakeRoom(0)) {
+    return false;
+  }
+  bool isKnown = false;
   for (int attempt = 0; attempt < kAttempts; ++attempt) {
-    unsigned int before = 0;
-    unsigned int after = 0;
-    if (!ReadNumber(*lengthTag_, &before) || !MakeRoom(before)) {
-      return false;
-    }
     const bool isRead = tokenTag_->ReadText(text);
     if (!isRead) {
       error_ = tokenTag_->Error();
     }
-    if (!ReadNumber(*lengthTag_, &after)) {
+    const unsigned int before = *length;
+    if (!ReadNumber(*lengthTag_, length)) {
       return false;
     }
-    if (before != after) {
-      continue;
+    const bool isSettled = isKnown && before == *length;
+    if (isRead ? isSettled || text->size() == *length : isSettled && *length <= roomCharacters_) {
+      return isRead;
     }
-    *length = after;
-    return isRead;
+    isKnown = true;
+    if (!MakeRoom(*length)) {
+      return false;
+    }
   }
   return false;
 }
@@ -104,26 +109,34 @@ bool TokenReader::ReadHexMode(bool* isHex) {
 }
 
 TokenReader::Outcome TokenReader::Peek(ReceivedToken* token) {
-  unsigned int waiting = 0;
-  if (!CountWaiting(&waiting)) {
+  if (!Prepare()) {
     return Outcome::kFailed;
-  }
-  if (waiting == 0) {
-    return Outcome::kEmpty;
   }
   bool isHex = false;
-  std::string text;
   unsigned int length = 0;
-  if (!ReadHexMode(&isHex) || !ReadStable(&text, &length)) {
+  if (!ReadHexMode(&isHex) || !ReadStable(&text_, &length)) {
     return Outcome::kFailed;
   }
-  token->isCut = text.size() < length;
+  if (length == 0) {
+    // No token, an empty one, or one that has come meanwhile.
+    unsigned int waiting = 0;
+    if (!CountWaiting(&waiting)) {
+      return Outcome::kFailed;
+    }
+    if (waiting == 0) {
+      return Outcome::kEmpty;
+    }
+    if (!ReadStable(&text_, &length)) {
+      return Outcome::kFailed;
+    }
+  }
+  token->isCut = text_.size() < length;
   token->lengthBytes = length;
   // A token that was queued before hex mode was switched on is still plain.
-  if (isHex && !token->isCut && ParseHexBytes(text, &token->bytes)) {
+  if (isHex && !token->isCut && ParseHexBytes(text_, &token->bytes)) {
     token->lengthBytes = static_cast<unsigned int>(token->bytes.size());
   } else {
-    token->bytes = text;
+    token->bytes = text_;
   }
   return Outcome::kToken;
 }

@@ -15,8 +15,8 @@ struct ReceivedToken {
   bool isCut = false;            // plain mode and a zero byte in it: `bytes` ends in front of that
 };
 
-// Takes tokens through the tags, one after the other: asks for the length first and reads through a
-// tag that is long enough, so that no token is too long. One thread.
+// Takes tokens through the tags, one after the other, and reads through a longer tag when a token
+// is too long for the one at hand. One thread.
 //
 // The tags are separate reads. While the queue is full the driver drops its oldest token at any
 // time, also between the read and the acknowledge, which then drops the one behind it; no reader
@@ -71,5 +71,6 @@ class TokenReader {
   std::unique_ptr<HostTag> tokenTag_;
   std::optional<bool> hexMode_;
   unsigned int roomCharacters_ = 0;  // longest text that tokenTag_ can read
+  std::string text_;                 // of the last read, for its memory
   std::string error_;
 };
