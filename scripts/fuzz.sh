@@ -1,8 +1,8 @@
 #!/usr/bin/env bash
 # SPDX-License-Identifier: Apache-2.0
 # Fuzzes the driver with the address and undefined behaviour sanitizers: scripts/fuzz.sh [SECONDS]
-# [TARGET...]. Without arguments 60 seconds a target and all targets, one after the other. An input
-# that breaks something stands in fuzz/corpus/TARGET afterwards, where the ordinary tests replay it.
+# [TARGET...]. Without arguments 60 seconds a target and all targets, as many at a time as there are
+# processors. An input that breaks something stands in fuzz/corpus/TARGET afterwards, where the ordinary tests replay it.
 # What a run learns is kept in the build folder (LOKA_FUZZ_DIR, build/fuzz otherwise) for the next run.
 
 . "$(dirname "$0")/lib.sh"
@@ -24,25 +24,33 @@ ninja -C "$build_dir" "${targets[@]/#/fuzz_}" >/dev/null
 # last_value FILE NAME: a figure of the engine's closing statistics.
 last_value() { sed -n "s/^stat::$2: *//p" "$1" | tail -1; }
 
-failed=0
-mkdir -p "$build_dir/learnt"
-for target in "${targets[@]}"; do
-  learnt=$build_dir/learnt/$target
-  log=$build_dir/learnt/$target.log
+# fuzz TARGET: runs one target, prints a line of figures and what was found.
+fuzz() {
+  local target=$1 verdict=ok
+  local learnt=$build_dir/learnt/$target log=$build_dir/learnt/$target.log
   mkdir -p "$learnt"
-  verdict=ok
   nice -n 19 "$build_dir/fuzz_$target" -max_total_time="$seconds" -timeout=25 -max_len=1024 \
     -print_final_stats=1 -artifact_prefix="$project_dir/fuzz/corpus/$target/" \
     "$learnt" "$project_dir/fuzz/corpus/$target" >"$log" 2>&1 || verdict=FAILED
-  edges=$(grep -ao 'cov: [0-9]*' "$log" | tail -1 | tr -dc 0-9)
   printf '%-10s %s: %s inputs in %s s, %s edges covered, %s inputs learnt\n' "$target" "$verdict" \
-    "$(last_value "$log" number_of_executed_units)" "$seconds" "${edges:-?}" \
-    "$(find "$learnt" -type f | wc -l)"
-  if [ "$verdict" != ok ]; then
-    failed=$((failed + 1))
-    grep -aE '^fuzz:|SUMMARY|Test unit written' "$log" || tail -5 "$log"
+    "$(last_value "$log" number_of_executed_units)" "$seconds" \
+    "$(grep -ao 'cov: [0-9]*' "$log" | tail -1 | tr -dc 0-9)" "$(find "$learnt" -type f | wc -l)"
+  [ "$verdict" = ok ] && return
+  grep -aE '^fuzz:|SUMMARY|Test unit written' "$log" || tail -5 "$log"
+  return 1
+}
+
+failed=0
+running=0
+for target in "${targets[@]}"; do
+  if [ "$running" -ge "$(nproc)" ]; then
+    wait -n || failed=$((failed + 1))
+    running=$((running - 1))
   fi
+  fuzz "$target" &
+  running=$((running + 1))
 done
+for ((; running > 0; running--)); do wait -n || failed=$((failed + 1)); done
 
 [ "$failed" -eq 0 ] || die "fuzz.sh: $failed of ${#targets[@]} targets failed (see above)"
 say "fuzz.sh: ${#targets[@]} targets, $seconds seconds each, nothing found"
