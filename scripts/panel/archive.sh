@@ -8,6 +8,11 @@ archive_version() {
 archive_name() { echo "libLOKA-$(archive_version)-$1"; }
 archive_file() { echo "$project_dir/build/dist/$(archive_name "$1").tar.gz"; }
 
+# archive_date: of the last change; a source tree without history has that of its main file.
+archive_date() {
+  git -C "$project_dir" log -1 --format=%cI 2>/dev/null || date -r "$project_dir/CMakeLists.txt" -Is
+}
+
 # make_archive ABI: from the built library.
 make_archive() {
   local abi=$1 folder
@@ -25,6 +30,6 @@ make_archive() {
     xargs sha256sum >SHA256SUMS)
   # The same sources give the same archive.
   tar -C "$project_dir/build/dist" --sort=name --owner=0 --group=0 --numeric-owner \
-    --mtime="$(git -C "$project_dir" log -1 --format=%cI)" -cf - "$(archive_name "$abi")" |
+    --mtime="$(archive_date)" -cf - "$(archive_name "$abi")" |
     gzip -9n >"$(archive_file "$abi")"
 }

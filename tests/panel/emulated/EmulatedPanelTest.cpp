@@ -1,8 +1,10 @@
 // SPDX-License-Identifier: Apache-2.0
 // The library and the reference host in an emulated panel, with a simulated device at the other end
-// of the panel's UART. LOKA_PANEL_IMAGE names the folder with kernel and file system.
+// of the panel's UART. LOKA_PANEL_IMAGE names the folder with kernel and file system; the disk is
+// there as well, or where LOKA_PANEL_DISK says.
 #include <gtest/gtest.h>
 
+#include <algorithm>
 #include <cstdio>
 #include <cstdlib>
 #include <memory>
@@ -25,20 +27,32 @@ std::string ImageFolder() {
   const char* folder = std::getenv("LOKA_PANEL_IMAGE");
   return folder != nullptr ? folder : "";
 }
-std::string Disk() { return ImageFolder() + "/disk"; }
+std::string Disk() {
+  const char* disk = std::getenv("LOKA_PANEL_DISK");
+  return disk != nullptr ? disk : ImageFolder() + "/disk";
+}
+
+// How the minimal host is started with the library of an ABI.
+struct Abi {
+  const char* name;
+  const char* host;
+};
+constexpr Abi kArmhf = {"armhf", "minimal_host /opt/libLOKA.so"};
+constexpr Abi kArmel = {
+    "armel", "env LD_LIBRARY_PATH=/armel/lib /armel/opt/minimal_host /armel/opt/libLOKA.so"};
 
 std::string Quoted(const std::string& text) { return "'" + text + "'"; }
 
 // The minimal host in the panel, its port the UART.
 class PanelSession final : public HostSession {
  public:
-  explicit PanelSession(EmulatedPanel& panel) : panel_(panel) {
-    panel_.Run("mkfifo /tmp/to-host /tmp/from-host");
+  PanelSession(EmulatedPanel& panel, const Abi& abi) : panel_(panel), abi_(abi) {
+    panel_.Run("rm -f /tmp/to-host /tmp/from-host; mkfifo /tmp/to-host /tmp/from-host");
   }
 
   std::string Start(const std::string& configuration) override {
     return panel_
-        .Run("minimal_host /opt/libLOKA.so " + std::string(kPort) + " 0 " + Quoted(configuration) +
+        .Run(std::string(abi_.host) + " " + kPort + " 0 " + Quoted(configuration) +
              " </tmp/to-host >/tmp/from-host 2>&1 & pid=$!; "
              "exec 3>/tmp/to-host 4</tmp/from-host; IFS= read -r r <&4; echo \"$r\"")
         .output;
@@ -61,6 +75,7 @@ class PanelSession final : public HostSession {
 
  private:
   EmulatedPanel& panel_;
+  const Abi abi_;
 };
 
 // One panel for all cases; each starts and ends its own host in it.
@@ -113,18 +128,32 @@ class EmulatedPanelTest : public ::testing::Test {
   }
   static std::string KernelSettings() { return Done("line_settings " + std::string(kPort)); }
 
-  // Starts the minimal host, which ends after this many tokens; its output goes to /tmp/minimal.
-  static void StartMinimalHost(int tokens, const std::string& settings) {
-    Done("minimal_host /opt/libLOKA.so " + std::string(kPort) + " " + std::to_string(tokens) +
-         " 'CfgVer=1 model=1 port=com1 mode=RS-232 " + settings + "' >/tmp/minimal 2>&1 & pid=$!");
-    Done(
-        "until grep -q started /tmp/minimal; do kill -0 $pid || { cat /tmp/minimal; break; }; "
-        "usleep 50000; done; grep -q started /tmp/minimal");
+  // Starts a program that prints tokens into /tmp/out, and waits for the line that says it runs.
+  static void StartPrinting(const std::string& command, const std::string& errors,
+                            const std::string& file, const std::string& said) {
+    Done(command + " >/tmp/out 2>" + errors + " & pid=$!");
+    Done("until grep -q '" + said + "' " + file +
+         "; do kill -0 $pid || { cat /tmp/out; break; }; usleep 50000; done; grep -q '" + said +
+         "' " + file);
+  }
+  // The minimal host, which ends after this many tokens. Its first line is "started".
+  static void StartMinimalHost(int tokens, const std::string& settings, const Abi& abi = kArmhf) {
+    StartPrinting(std::string(abi.host) + " " + kPort + " " + std::to_string(tokens) +
+                      " 'CfgVer=1 model=1 port=com1 mode=RS-232 " + settings + "'",
+                  "&1", "/tmp/out", "started");
+  }
+  // The reference host, likewise; what it says to people goes to /tmp/said.
+  static void StartSub(int tokens, const std::string& options) {
+    StartPrinting("loka sub " + std::string(kPort) + " --no-store -b 115200 -p none -C " +
+                      std::to_string(tokens) + " " + options,
+                  "/tmp/said", "/tmp/said", "rx none");
   }
   static void WaitForOutput(std::size_t bytes) {
-    Done("until [ $(wc -c </tmp/minimal) -ge " + std::to_string(bytes) +
-         " ]; do kill -0 $pid || break; usleep 20000; done");
+    Done("until [ $(wc -c </tmp/out) -ge " + std::to_string(bytes) +
+         " ]; do kill -0 $pid || break; usleep 100000; done");
   }
+
+  static std::string Stream(int tokens, std::size_t printedBefore);
 
   static std::unique_ptr<EmulatedPanel> panel_;
   bool isRunning_ = false;
@@ -312,37 +341,70 @@ TEST_F(EmulatedPanelTest, DisconnectAndConnect) {
   EXPECT_EQ(Token(), "AGAIN");
 }
 
+// A token of four letters, which count.
+std::string CountingToken(int number) {
+  std::string token;
+  for (const int divisor : {17576, 676, 26, 1}) {
+    token += static_cast<char>('a' + number / divisor % 26);
+  }
+  return token + "\n";
+}
+
 // The device sends at the line's rate, as long as the panel is not further behind than its kernel
-// can keep: an emulator on a busy machine is slower than the line, and that is no loss of the
-// panel's.
-TEST_F(EmulatedPanelTest, AStreamOf100000TokensWithoutLoss) {
-  constexpr int kTokens = 100000;
+// and the driver's queue can keep: an emulator is slower than the line, and that is no loss of the
+// panel's. The hosts have a gap of seconds, so that a busy machine makes no silence. Gives what was
+// sent.
+std::string EmulatedPanelTest::Stream(int tokens, std::size_t printedBefore) {
   constexpr int kPieceTokens = 2500;
   constexpr int kPiecesAhead = 3;
   constexpr int kRate = 115200;
-  StartMinimalHost(kTokens,
-                   "baudrate=115200 parity=none bits=8 stopbits=1 rx_suffix=0A "
-                   "token_queue_size=10000");
-  std::string expected = "started\n";
-  for (int i = 0; i < kTokens;) {
+  std::string sent;
+  for (int i = 0; i < tokens;) {
     std::string piece;
-    for (const int end = i + kPieceTokens; i < end; ++i) {
-      // Four letters count the tokens.
-      for (const int divisor : {17576, 676, 26, 1}) {
-        piece += static_cast<char>('a' + i / divisor % 26);
-      }
-      piece += '\n';
+    for (const int end = std::min(i + kPieceTokens, tokens); i < end; ++i) {
+      piece += CountingToken(i);
     }
     panel_->SendAtRate(piece, kRate);
-    expected += piece;
+    sent += piece;
     const std::size_t ahead = piece.size() * kPiecesAhead;
-    if (expected.size() > ahead) WaitForOutput(expected.size() - ahead);
+    if (sent.size() > ahead) WaitForOutput(printedBefore + sent.size() - ahead);
   }
-  WaitForOutput(expected.size());
+  WaitForOutput(printedBefore + sent.size());
   Done("wait $pid");
-  EXPECT_EQ(Done("wc -l </tmp/minimal"), std::to_string(kTokens + 1));
-  const std::string output = Done("cat /tmp/minimal") + "\n";
-  EXPECT_TRUE(output == expected) << "other tokens than those that were sent";
+  return sent;
+}
+
+TEST_F(EmulatedPanelTest, AStreamOf100000TokensWithoutLoss) {
+  StartSub(100000, "--rx-suffix 0A --gap 3000 --queue 10000");
+  const std::string sent = Stream(100000, 0);
+  EXPECT_EQ(Done("wc -l </tmp/out"), "100000");
+  EXPECT_TRUE(Done("cat /tmp/out") + "\n" == sent) << "other tokens than those that were sent";
+  EXPECT_EQ(Done("grep drop /tmp/said; true"), "");
+}
+
+TEST_F(EmulatedPanelTest, AStreamIntoTheMinimalHost) {
+  StartMinimalHost(10000,
+                   "baudrate=115200 parity=none bits=8 stopbits=1 rx_suffix=0A gap=3000 "
+                   "token_queue_size=10000");
+  const std::string started = "started\n";
+  const std::string sent = Stream(10000, started.size());
+  EXPECT_TRUE(Done("cat /tmp/out") + "\n" == started + sent) << "other tokens than those sent";
+}
+
+// A device that does not wait: what the queue cannot keep is lost, and each loss is told.
+TEST_F(EmulatedPanelTest, NoTokenIsLostInSilence) {
+  constexpr int kTokens = 20000;
+  StartSub(kTokens, "--rx-suffix 0A --gap 3000 --queue 50");
+  std::string sent;
+  for (int i = 0; i < kTokens; ++i) sent += CountingToken(i);
+  panel_->SendAtRate(sent, 115200);
+  Done("n=0; while o=$n; n=$(cat /tmp/out /tmp/said | wc -l); [ $n != $o ]; do sleep 2; done");
+  Done("kill -TERM $pid; wait $pid; true");
+  const int printed = std::stoi(Done("wc -l </tmp/out"));
+  const int told = std::stoi(Done("grep -c 'drop queue-full' /tmp/said; true"));
+  std::printf("unpaced stream              %d tokens printed, %d told as lost\n", printed, told);
+  EXPECT_EQ(printed + told, kTokens);
+  EXPECT_EQ(Done("cat /tmp/out | sort -u | wc -l"), std::to_string(printed));
 }
 
 // The plug-in tests, with those that user-mode emulation cannot run. The exhaustive comparison
@@ -362,22 +424,98 @@ TEST_F(EmulatedPanelTest, PluginTests) {
   EXPECT_NE(reply.output.find("PASSED"), std::string::npos) << reply.output;
 }
 
-// The library from the archive in the minimal host, on the UART.
+// The library of each archive in the minimal host, on the UART.
 TEST_F(EmulatedPanelTest, ChecksInTheMinimalHost) {
-  PanelSession host(*panel_);
   const std::vector<HostCheck> checks = HostChecks();
-  for (const HostCheck& check : checks) EXPECT_EQ(Problems(check, host), "") << check.name;
-  std::printf("checks in the minimal host  %zu\n", checks.size());
+  for (const Abi& abi : {kArmhf, kArmel}) {
+    PanelSession host(*panel_, abi);
+    for (const HostCheck& check : checks) {
+      EXPECT_EQ(Problems(check, host), "") << abi.name << " " << check.name;
+    }
+    std::printf("%-8s checks in the minimal host      %zu\n", abi.name, checks.size());
+  }
 }
 
-TEST_F(EmulatedPanelTest, MinimalHost) {
-  StartMinimalHost(2, "baudrate=19200 parity=odd bits=7 stopbits=2 rx_prefix=02 rx_suffix=03");
-  EXPECT_EQ(KernelSettings(), "19200 7O2");
-  std::printf("one started protocol        %s\n",
-              Done("grep -E 'VmRSS|VmData' /proc/$pid/status | tr -s '\\t\\n ' ' '").c_str());
-  panel_->SendOnLine("\x02ONE\x03\x02TWO\x03");
-  Done("wait $pid");
-  EXPECT_EQ(Done("cat /tmp/minimal"), "started\nONE\nTWO");
+// Clock ticks of the panel: what the process has used, and what has passed.
+struct Usage {
+  double usedTicks = 0;
+  double passedTicks = 0;
+};
+
+class FiguresTest : public EmulatedPanelTest {
+ protected:
+  static Usage UsageNow() {
+    constexpr int kTicksPerSecond = 100;
+    std::istringstream words(Done("cut -d' ' -f14,15 /proc/$pid/stat; cut -d' ' -f1 /proc/uptime"));
+    double user = 0;
+    double system = 0;
+    double uptimeSeconds = 0;
+    words >> user >> system >> uptimeSeconds;
+    return {user + system, uptimeSeconds * kTicksPerSecond};
+  }
+
+  static void PrintMemory(const Abi& abi) {
+    StartMinimalHost(1, "baudrate=9600 parity=none bits=8 stopbits=1 rx_suffix=0A", abi);
+    const int residentKib =
+        std::stoi(Done("sed -n 's/VmRSS:[^0-9]*\\([0-9]*\\).*/\\1/p' "
+                       "/proc/$pid/status"));
+    const int libraryKib =
+        std::stoi(Done("awk '/-/ { own = /libLOKA/ } /^Rss:/ && own { sum += $2 } "
+                       "END { print sum }' /proc/$pid/smaps"));
+    std::printf("%-8s one started protocol            %d KiB resident, %d KiB of it libLOKA\n",
+                abi.name, residentKib, libraryKib);
+    EXPECT_LT(residentKib, 4096);
+    EXPECT_LT(libraryKib, 512);
+    EXPECT_GT(libraryKib, 0);
+    panel_->SendOnLine("X\n");
+    Done("wait $pid");
+  }
+
+  static void PrintStart(const Abi& abi) {
+    constexpr int kRuns = 10;
+    const std::string once = std::string(abi.host) + " " + kPort +
+                             " 0 'CfgVer=1 model=1 port=com1 mode=RS-232 baudrate=9600 "
+                             "parity=none bits=8 stopbits=1 gap=1' </dev/null | grep -c started";
+    std::istringstream words(Done("cut -d' ' -f1 /proc/uptime; for i in 1 2 3 4 5 6 7 8 9 10; do " +
+                                  once + "; done | wc -l; cut -d' ' -f1 /proc/uptime"));
+    double before = 0;
+    double after = 0;
+    int runs = 0;
+    words >> before >> runs >> after;
+    EXPECT_EQ(runs, kRuns);
+    std::printf("%-8s load, start, stop, unload       %.0f ms\n", abi.name,
+                (after - before) * 1000 / kRuns);
+  }
+
+  static void PrintCpuShare(const Abi& abi, int rate) {
+    constexpr int kSeconds = 4;
+    const std::string token = "0123456789012345678\n";
+    const int tokens = rate / 10 / static_cast<int>(token.size()) * kSeconds;
+    StartMinimalHost(tokens + 1,
+                     "parity=none bits=8 stopbits=1 rx_suffix=0A gap=1000 token_queue_size=10000 "
+                     "baudrate=" +
+                         std::to_string(rate),
+                     abi);
+    std::string sent;
+    for (int i = 0; i < tokens; ++i) sent += token;
+    const Usage before = UsageNow();
+    panel_->SendAtRate(sent, rate);
+    WaitForOutput(sent.size() + std::string("started\n").size());
+    const Usage after = UsageNow();
+    std::printf(
+        "%-8s tokens of 20 bytes, %6d bit/s  %.0f %% of the emulated processor\n", abi.name, rate,
+        100 * (after.usedTicks - before.usedTicks) / (after.passedTicks - before.passedTicks));
+    panel_->SendOnLine(token);
+    Done("wait $pid");
+  }
+};
+
+TEST_F(FiguresTest, OfTheMinimalHost) {
+  for (const Abi& abi : {kArmhf, kArmel}) {
+    PrintMemory(abi);
+    PrintStart(abi);
+    for (const int rate : {9600, 115200}) PrintCpuShare(abi, rate);
+  }
 }
 
 // The last case: the panel of the others is gone afterwards.
