@@ -8,8 +8,8 @@
 // The runtime library skips atomic operations in a process with one thread. It asks a variable that
 // the C library has since version 2.32 only. 0 means "there may be several", which is always right.
 extern "C" {
-extern char __libc_single_threaded;
-char __libc_single_threaded = 0;
+extern char __libc_single_threaded;  // NOLINT(bugprone-reserved-identifier): that name is its
+char __libc_single_threaded = 0;     // NOLINT(bugprone-reserved-identifier)
 }
 
 // The usual handler prints the name of an exception that nobody caught before it aborts, and brings
