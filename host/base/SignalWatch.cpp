@@ -15,7 +15,20 @@
 #include <thread>
 #include <utility>
 
+#include "host/base/Deadline.h"
 #include "host/base/ExitStatus.h"
+
+namespace {
+
+// More than the driver's task and a port with bytes to send may take together.
+constexpr int kEndLimitMs = 8000;
+
+// What must be put back whatever happens is registered with at_quick_exit.
+[[noreturn]] void EndAtOnce(int signalNumber) {
+  std::quick_exit(static_cast<int>(ExitStatus::kFirstSignal) + signalNumber);
+}
+
+}  // namespace
 
 struct SignalWatch::State {
   Handler onSignal;
@@ -28,25 +41,30 @@ struct SignalWatch::State {
 };
 
 void SignalWatch::State::Run() {
-  bool isFirst = true;
+  int firstSignal = 0;
+  Deadline limit = Deadline::After(0);
   for (;;) {
     std::array<pollfd, 2> waits = {{{signalDescriptor, POLLIN, 0}, {endDescriptor, POLLIN, 0}}};
-    if (poll(waits.data(), waits.size(), -1) < 0 && errno != EINTR) {
+    const int limitMs = firstSignal == 0 ? -1 : limit.RemainingMs();
+    if (poll(waits.data(), waits.size(), limitMs) < 0 && errno != EINTR) {
       return;
     }
     if ((waits[1].revents & POLLIN) != 0) {
       return;
+    }
+    if (firstSignal != 0 && limit.HasPassed()) {
+      EndAtOnce(firstSignal);
     }
     signalfd_siginfo info{};
     if (read(signalDescriptor, &info, sizeof info) != static_cast<ssize_t>(sizeof info)) {
       continue;
     }
     const int signalNumber = static_cast<int>(info.ssi_signo);
-    if (!isFirst) {
-      // What must be put back whatever happens is registered with at_quick_exit.
-      std::quick_exit(static_cast<int>(ExitStatus::kFirstSignal) + signalNumber);
+    if (firstSignal != 0) {
+      EndAtOnce(signalNumber);
     }
-    isFirst = false;
+    firstSignal = signalNumber;
+    limit = Deadline::After(kEndLimitMs);
     onSignal(signalNumber);
   }
 }

@@ -1,6 +1,8 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "host/commands/RunCommand.h"
 
+#include <unistd.h>
+
 #include <CLI/CLI.hpp>
 #include <limits>
 
@@ -13,6 +15,7 @@
 #include "host/events/WallClock.h"
 #include "host/instance/LocalInstance.h"
 #include "host/log/LogFile.h"
+#include "host/text/BackgroundLines.h"
 #include "host/text/Output.h"
 
 namespace {
@@ -20,7 +23,7 @@ namespace {
 constexpr int kForeverMs = std::numeric_limits<int>::max();
 
 // Writes what happens to standard error, one line with the time each, as a service's journal wants
-// it.
+// it. A journal that does not read must not stop the instance.
 class LogPrinter final : public EventSink {
  public:
   LogPrinter(int verbosity, bool isQuiet) : verbosity_(verbosity), isQuiet_(isQuiet) {}
@@ -33,10 +36,11 @@ class LogPrinter final : public EventSink {
     if (isQuiet_ || (isTraffic && verbosity_ < 2) || (isToken && verbosity_ < 1)) {
       return;
     }
-    TellUser(LocalTimeText(event.timeUs) + " " + EventText(event));
+    lines_.Write("loka: " + LocalTimeText(event.timeUs) + " " + EventText(event));
   }
 
  private:
+  BackgroundLines lines_{STDERR_FILENO};
   const int verbosity_;
   const bool isQuiet_;
 };
@@ -81,10 +85,12 @@ int RunRun(RunOptions* options) {
                                              : "left to those who attach (--ack never)"));
     TellUser("ready; commands attach at " + ControlPath(instance->Port()));
   }
-  LogPrinter printer(options->access.verbosity, options->access.isQuiet);
-  SinkPair sinks(&printer, log.get());
-  answer = instance->Serve(
-      &sinks, [] { return false; }, Deadline::After(kForeverMs));
+  {
+    LogPrinter printer(options->access.verbosity, options->access.isQuiet);
+    SinkPair sinks(&printer, log.get());
+    answer = instance->Serve(
+        &sinks, [] { return false; }, Deadline::After(kForeverMs));
+  }
   return EndOf(*instance, answer);
 }
 

@@ -25,6 +25,7 @@
 #include "host/events/EventJson.h"
 #include "host/events/JsonLine.h"
 #include "host/events/WallClock.h"
+#include "host/text/Output.h"
 
 namespace {
 
@@ -33,6 +34,7 @@ using Json = nlohmann::json;
 constexpr std::size_t kMaxRequestBytes = std::size_t{1024} * 1024;
 constexpr std::size_t kMaxWaitingBytes = std::size_t{1024} * 1024;  // of events, for one client
 constexpr int kBacklog = 16;
+constexpr int kAcceptPauseMs = 200;  // where there is no descriptor for another client
 constexpr std::size_t kMaxClients = 64;
 
 bool MakeAddress(const std::string& path, sockaddr_un* address, std::string* error) {
@@ -99,6 +101,7 @@ struct ControlServer::Client {
   std::string output;
   bool isSubscribed = false;
   std::uint64_t missedEvents = 0;
+  std::string missedPort;
   bool isGone = false;
 };
 
@@ -147,18 +150,13 @@ void ControlServer::OnEvent(const HostEvent& event) {
     }
     if (client.output.size() > kMaxWaitingBytes) {
       ++client.missedEvents;
+      client.missedPort = event.port;
       continue;
     }
     if (line.empty()) {
       line = ToJsonLine(event) + "\n";
     }
-    if (client.missedEvents > 0) {
-      const HostEvent note{
-          WallClockUs(), event.port,
-          NoteMade{std::to_string(client.missedEvents) + " events were not read in time"}};
-      client.output += ToJsonLine(note) + "\n";
-      client.missedEvents = 0;
-    }
+    TellMissed(&client);
     client.output += line;
   }
   if (!line.empty()) {
@@ -166,9 +164,23 @@ void ControlServer::OnEvent(const HostEvent& event) {
   }
 }
 
+// With the lock held. Whoever reads again must not have to wait for the next event to know.
+void ControlServer::TellMissed(Client* client) {
+  if (client->missedEvents == 0) {
+    return;
+  }
+  const HostEvent note{
+      WallClockUs(), client->missedPort,
+      NoteMade{std::to_string(client->missedEvents) + " events were not read in time"}};
+  client->output += ToJsonLine(note) + "\n";
+  client->missedEvents = 0;
+}
+
 void ControlServer::Run() {
   while (!isEnding_.load()) {
-    std::vector<pollfd> waits = {{listenDescriptor_, POLLIN, 0},
+    const bool isAccepting = !acceptPause_ || acceptPause_->HasPassed();
+    // A negative descriptor is left out (poll(2)).
+    std::vector<pollfd> waits = {{isAccepting ? listenDescriptor_ : -1, POLLIN, 0},
                                  {wake_.FileDescriptor(), POLLIN, 0}};
     {
       const std::lock_guard<std::mutex> lock(mutex_);
@@ -180,7 +192,8 @@ void ControlServer::Run() {
         waits.push_back({client.descriptor, static_cast<short>(input | output), 0});
       }
     }
-    if (poll(waits.data(), waits.size(), -1) < 0 && errno != EINTR) {
+    const int limitMs = isAccepting ? -1 : acceptPause_->RemainingMs();
+    if (poll(waits.data(), waits.size(), limitMs) < 0 && errno != EINTR) {
       return;
     }
     wake_.Clear();
@@ -194,6 +207,9 @@ void ControlServer::Run() {
       if (!client.isGone) {
         const std::lock_guard<std::mutex> lock(mutex_);
         client.isGone = !Flush(&client);
+        if (client.output.empty()) {
+          TellMissed(&client);
+        }
       }
     }
     if ((waits[0].revents & POLLIN) != 0) {
@@ -205,8 +221,17 @@ void ControlServer::Run() {
 void ControlServer::Accept() {
   const int descriptor = accept4(listenDescriptor_, nullptr, nullptr, SOCK_CLOEXEC | SOCK_NONBLOCK);
   if (descriptor < 0) {
+    // Who wants in stays in the queue, so asking again at once would never end.
+    const bool isGone = errno == EAGAIN || errno == ECONNABORTED || errno == EINTR;
+    if (!isGone && !acceptPause_) {
+      TellUser("nobody else can attach for now: " + SystemErrorText(errno));
+    }
+    if (!isGone) {
+      acceptPause_ = Deadline::After(kAcceptPauseMs);
+    }
     return;
   }
+  acceptPause_.reset();
   const std::lock_guard<std::mutex> lock(mutex_);
   if (clients_.size() >= kMaxClients || !IsPeerTrusted(descriptor)) {
     (void)close(descriptor);

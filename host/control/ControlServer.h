@@ -8,9 +8,11 @@
 #include <memory>
 #include <mutex>
 #include <nlohmann/json_fwd.hpp>
+#include <optional>
 #include <string>
 #include <thread>
 
+#include "host/base/Deadline.h"
 #include "host/control/LineBuffer.h"
 #include "host/events/EventSink.h"
 #include "host/instance/Answer.h"
@@ -53,6 +55,7 @@ class ControlServer final : public EventSink {
   void HandleLine(Client* client, const std::string& line);
   Answer Carry(const nlohmann::json& request) const;
   static bool Flush(Client* client);
+  static void TellMissed(Client* client);
 
   const std::string path_;
   const int listenDescriptor_;
@@ -64,5 +67,6 @@ class ControlServer final : public EventSink {
   // Guards the clients' outgoing bytes and whether they listen to events.
   std::mutex mutex_;
   std::list<Client> clients_;
+  std::optional<Deadline> acceptPause_;  // used on the server's thread only
   std::thread thread_;
 };

@@ -13,6 +13,8 @@ namespace {
 // What may wait for a serving thread that is busy. Beyond it bytes are counted, not kept: the
 // driver has them all the same.
 constexpr std::size_t kMaxKeptBytes = std::size_t{8} * 1024 * 1024;
+// A device that sends byte by byte makes a record of each.
+constexpr std::size_t kMaxKeptRecords = 100000;
 
 std::int64_t MonotonicNs() {
   return std::chrono::duration_cast<std::chrono::nanoseconds>(
@@ -29,7 +31,10 @@ std::int64_t WallOf(std::int64_t monotonicNs) {
 
 void LineIntake::Add(LineRecord record) {
   const std::lock_guard<std::mutex> lock(mutex_);
-  if (keptBytes_ + record.bytes.size() > kMaxKeptBytes) {
+  // Once bytes are missing, those behind them would be read as their continuation.
+  const bool isFull = missedBytes_ > 0 || keptBytes_ + record.bytes.size() > kMaxKeptBytes ||
+                      records_.size() >= kMaxKeptRecords;
+  if (isFull && !record.bytes.empty()) {
     missedBytes_ += record.bytes.size();
     return;
   }
@@ -155,6 +160,7 @@ std::vector<LineRecord> LineIntake::Take(const Deadline& deadline) {
   }
   if (missedBytes_ > 0) {
     LineRecord record;
+    record.kind = LineRecord::Kind::kMissed;
     record.timeUs = WallClockUs();
     record.text = std::to_string(missedBytes_) + " bytes came too fast to be shown one by one";
     missedBytes_ = 0;

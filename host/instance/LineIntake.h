@@ -15,7 +15,7 @@ class Deadline;
 
 // One thing that happened on the line, in the order in which the driver saw it.
 struct LineRecord {
-  enum class Kind { kServed, kSilence, kSent, kLost, kBack, kNote };
+  enum class Kind { kServed, kSilence, kSent, kLost, kBack, kNote, kMissed };
 
   Kind kind = Kind::kNote;
   std::int64_t timeUs = 0;          // time of day at which it happened, microseconds since 1970
@@ -25,7 +25,7 @@ struct LineRecord {
   std::size_t takenBytes = 0;  // kSent: how many the line took
   int silenceMs = 0;           // kSilence
   int errorNumber = 0;         // kLost
-  std::string text;            // kLost, kNote
+  std::string text;            // kLost, kNote, kMissed: bytes that were not kept
 };
 
 // Keeps what the port tells until the thread that serves the instance takes it. Any thread.

@@ -12,6 +12,8 @@
 namespace {
 
 constexpr int kLineWaitStepMs = 5;
+constexpr int kTurnOfOthersMs = 1;
+constexpr std::size_t kMaxRecordsAtOnce = 100;
 
 Answer AnswerOf(const HostResult& result, bool hasStore) {
   Answer answer = Refusal(result.text, result.status);
@@ -140,11 +142,30 @@ Answer LocalInstance::HandleShared(const nlohmann::json& request) {
   return answer;
 }
 
+// Who has just let go of a mutex usually gets it again; the others must get their turn.
+std::unique_lock<std::mutex> LocalInstance::LockDriver() {
+  if (requests_->IsAnybodyWaiting()) {
+    Deadline::After(kTurnOfOthersMs).Sleep();
+  }
+  return std::unique_lock<std::mutex>(requests_->DriverMutex());
+}
+
 Answer LocalInstance::Pump(const Deadline& deadline, const std::function<bool()>& isDone) {
-  const std::vector<LineRecord> records = intake_.Take(
-      pump_->IsWaitingForLine() ? Deadline::Earlier(deadline, Deadline::After(kLineWaitStepMs))
-                                : deadline);
-  const std::lock_guard<std::mutex> lock(requests_->DriverMutex());
+  Deadline wait = deadline;
+  if (pump_->IsWaitingForLine() || pump_->HasMore()) {
+    wait = Deadline::Earlier(deadline, Deadline::After(pump_->HasMore() ? 0 : kLineWaitStepMs));
+  }
+  std::vector<LineRecord> records;
+  for (LineRecord& record : intake_.Take(wait)) {
+    // Much that came at once is worked off in parts, so that others can call the driver in between.
+    if (records.size() == kMaxRecordsAtOnce && StopSignal() == 0) {
+      const auto lock = LockDriver();
+      pump_->Follow(records);
+      records.clear();
+    }
+    records.push_back(std::move(record));
+  }
+  const auto lock = LockDriver();
   return pump_->Run(records, isDone);
 }
 

@@ -3,6 +3,7 @@
 
 #include <functional>
 #include <memory>
+#include <mutex>
 #include <string>
 
 #include "host/base/SignalWatch.h"
@@ -55,6 +56,7 @@ class LocalInstance final : public Instance {
   Answer Start(const Options& options);
   Answer Connect();
   Answer HandleShared(const nlohmann::json& request);
+  std::unique_lock<std::mutex> LockDriver();
   Answer Pump(const Deadline& deadline, const std::function<bool()>& isDone);
 
   LineIntake intake_;

@@ -162,7 +162,9 @@ Answer Requests::Handle(const Json& request) {
   if (!request.is_object()) {
     return Refusal("expected a JSON object with the key \"op\"", ExitStatus::kUsage);
   }
+  ++waitingRequests_;
   const std::lock_guard<std::mutex> lock(driverMutex_);
+  --waitingRequests_;
   return Dispatch(TextOf(request, "op"), request);
 }
 

@@ -70,6 +70,9 @@ class Requests {
   // Held by whoever else calls the driver.
   std::mutex& DriverMutex() { return driverMutex_; }
 
+  // A request of another thread waits for that mutex.
+  bool IsAnybodyWaiting() const { return waitingRequests_.load() > 0; }
+
   // The framing in effect; with the driver's mutex held.
   const FramingSettings& Framing() const { return framing_.Settings(); }
 
@@ -121,6 +124,7 @@ class Requests {
   SettingsBook settings_;    // guarded by driverMutex_
   FramingInEffect framing_;  // guarded by driverMutex_
   std::function<void()> giveTagsBack_;
+  std::atomic<int> waitingRequests_{0};
   std::atomic<std::uint64_t> settingsVersion_{0};
   std::atomic<std::uint64_t> headVersion_{0};
 };

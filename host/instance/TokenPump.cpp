@@ -11,8 +11,11 @@
 
 namespace {
 
-// More of the line's tokens than any queue of the driver holds are not worth keeping.
-constexpr std::size_t kMaxLineTokens = 20000;
+// More of the line's tokens than the driver's queue holds, and those that are being queued, are not
+// worth keeping.
+constexpr std::size_t kSpareLineTokens = 2000;
+// A device that never pauses must let others call the driver in between.
+constexpr int kMaxTokensAtOnce = 200;
 constexpr int kLineWaitMs = 50;
 
 }  // namespace
@@ -29,11 +32,15 @@ TokenPump::TokenPump(HostSession* session, EventStream* events, const Requests* 
   reader_.SetHexMode(requests->Framing().isHex);
 }
 
-Answer TokenPump::Run(const std::vector<LineRecord>& records, const std::function<bool()>& isDone) {
+void TokenPump::Follow(const std::vector<LineRecord>& records) {
   FollowSettings();
   for (const LineRecord& record : records) {
     Follow(record);
   }
+}
+
+Answer TokenPump::Run(const std::vector<LineRecord>& records, const std::function<bool()>& isDone) {
+  Follow(records);
   if (!acknowledges_) {
     FollowQueue();
   }
@@ -102,6 +109,12 @@ void TokenPump::Follow(const LineRecord& record) {
     case LineRecord::Kind::kBack:
       events_->Publish(PortChanged{"back", "", record.text}, record.timeUs);
       break;
+    case LineRecord::Kind::kMissed:
+      // The driver has had them: its tokens are no longer those of the bytes that are known.
+      check_.Interrupt();
+      lineTokens_.clear();
+      events_->Publish(NoteMade{record.text}, record.timeUs);
+      break;
     case LineRecord::Kind::kNote:
       events_->Publish(NoteMade{record.text}, record.timeUs);
       break;
@@ -152,7 +165,8 @@ void TokenPump::OnCutToken(const CutToken& token) {
   if (token.endOffset < servedBytes_) {
     frameFirstNs_ = recordFirstNs_;  // the next frame has begun in the same piece
   }
-  if (lineTokens_.size() > kMaxLineTokens) {
+  const auto queueTokens = static_cast<std::size_t>(std::max(requests_->Framing().queueTokens, 1));
+  if (lineTokens_.size() > queueTokens + kSpareLineTokens) {
     lineTokens_.pop_front();
   }
 }
@@ -175,7 +189,12 @@ std::optional<TokenReceived> TokenPump::Head() const {
 
 Answer TokenPump::PublishTokens(const std::function<bool()>& isDone) {
   ReceivedToken token;
-  while (!IsHeadPublished() && !isDone()) {
+  hasMore_ = false;
+  for (int left = kMaxTokensAtOnce; !IsHeadPublished() && !isDone(); --left) {
+    if (left == 0) {
+      hasMore_ = true;
+      return {};
+    }
     const std::uint64_t version = requests_->HeadVersion();
     const TokenReader::Outcome outcome = reader_.Peek(&token);
     if (outcome == TokenReader::Outcome::kEmpty) {
@@ -225,9 +244,13 @@ std::deque<TokenPump::LineToken>::iterator TokenPump::FindOnLine(const ReceivedT
   });
 }
 
-// For a moment only: a token that the host reads differently never shows up on the line.
+// For a moment only: a token that the host reads differently never shows up on the line. A queue
+// that is about to lose tokens does not wait at all.
 bool TokenPump::MustWaitForLine(const ReceivedToken& token) {
-  if (FindOnLine(token) != lineTokens_.end()) {
+  unsigned int waiting = 0;
+  const bool isHurried = reader_.CountWaiting(&waiting) && waiting > 1 &&
+                         waiting >= static_cast<unsigned int>(requests_->Framing().queueTokens) / 2;
+  if (isHurried || FindOnLine(token) != lineTokens_.end()) {
     lineWait_.reset();
     return false;
   }

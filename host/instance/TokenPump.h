@@ -30,6 +30,9 @@ class TokenPump final : public CheckSink {
   // pump then does not see every token and compares none.
   TokenPump(HostSession* session, EventStream* events, const Requests* requests, bool acknowledges);
 
+  // Works off records behind which more are there already; no token is taken.
+  void Follow(const std::vector<LineRecord>& records);
+
   // Works off the records, then the driver's queue until isDone, asked in front of each token, says
   // so: what nobody wants any more stays in the queue. Refused when the driver does not let its
   // tokens be read.
@@ -38,6 +41,10 @@ class TokenPump final : public CheckSink {
   // The driver has queued a token whose bytes are not among the records yet: it tells the port that
   // it took them when it asks for the next one. Run should be called again soon.
   bool IsWaitingForLine() const { return lineWait_.has_value(); }
+
+  // Tokens were left in the queue although they are wanted: Run should be called again at once,
+  // with the mutex free in between.
+  bool HasMore() const { return hasMore_; }
 
   // Gives the driver's tags back; they are made again when they are needed.
   void GiveTagsBack() { reader_.GiveTagsBack(); }
@@ -97,5 +104,6 @@ class TokenPump final : public CheckSink {
   std::optional<std::int64_t> frameFirstNs_;
   Frame frame_;  // what was told of the next token
   std::optional<Deadline> lineWait_;
+  bool hasMore_ = false;
   std::deque<LineToken> lineTokens_;  // cut from the line, not yet met in the driver's queue
 };

@@ -58,9 +58,24 @@ TEST(LineIntake, CountsWhatItCannotKeep) {
   }
   const std::vector<LineRecord> records = TakeNow(&intake);
   ASSERT_EQ(records.size(), 9U);
+  EXPECT_EQ(records.back().kind, LineRecord::Kind::kMissed);
   EXPECT_EQ(records.back().text, "2097152 bytes came too fast to be shown one by one");
   intake.OnServed(megabyte, 1, 1);
   EXPECT_EQ(TakeNow(&intake).size(), 1U);
+}
+
+TEST(LineIntake, KeepsNothingBehindWhatItCouldNotKeep) {
+  LineIntake intake;
+  // One byte a record, as a slow device sends them.
+  for (int i = 0; i < 100010; ++i) {
+    intake.OnServed("x", 1, 1);
+  }
+  intake.OnSilence(500);
+  const std::vector<LineRecord> records = TakeNow(&intake);
+  ASSERT_EQ(records.size(), 100002U);
+  EXPECT_EQ(records[99999].kind, LineRecord::Kind::kServed);
+  EXPECT_EQ(records[100000].kind, LineRecord::Kind::kSilence);
+  EXPECT_EQ(records[100001].text, "10 bytes came too fast to be shown one by one");
 }
 
 TEST(LineIntake, FirstSignalCounts) {
