@@ -71,20 +71,20 @@ Object fastTimer;
 Object hostFactory;
 int semaphores = 0;
 
-std::string Text(const char* text) { return text != nullptr ? text : "(null)"; }
+std::string TextOf(const char* text) { return text != nullptr ? text : "(null)"; }
 
 void* CreateInterface(Object* /*self*/, const char* name) {
-  Note("create " + Text(name));
+  Note("create " + TextOf(name));
   for (Object* object : {&multiTask, &serialFactory, &socketFactory, &cdsBuffer, &diag, &storage,
                          &driverInterface, &smux, &fastTimer}) {
     if (std::strcmp(object->name, name) == 0) return object;
   }
   return nullptr;
 }
-void ReleaseInterface(Object* /*self*/, Object* object) { Note("release " + Text(object->name)); }
+void ReleaseInterface(Object* /*self*/, Object* object) { Note("release " + TextOf(object->name)); }
 
 int StopTask(Object* /*self*/, Object* stopped, int timeoutMs) {
-  Note("stop " + Text(stopped->name) + " " + std::to_string(timeoutMs));
+  Note("stop " + TextOf(stopped->name) + " " + std::to_string(timeoutMs));
   return 1;
 }
 void* CreateSemaphore(Object* /*self*/, int argument) {
@@ -92,7 +92,7 @@ void* CreateSemaphore(Object* /*self*/, int argument) {
   return semaphores++ % 2 == 0 ? &queueSemaphore : &portSemaphore;
 }
 void DeleteSemaphore(Object* /*self*/, Object* semaphore) {
-  Note("delete " + Text(semaphore->name));
+  Note("delete " + TextOf(semaphore->name));
 }
 void Sleep(Object* /*self*/, int milliseconds) { Note("sleep " + std::to_string(milliseconds)); }
 void* CreateTask(Object* /*self*/, void* taskRunner, int taskClass) {
@@ -111,19 +111,19 @@ int StartTask(Object* /*self*/) {
 }
 
 int Lock(Object* self) {
-  Note(Text(self->name) + " lock");
+  Note(TextOf(self->name) + " lock");
   return 1;
 }
 int Unlock(Object* self) {
-  Note(Text(self->name) + " unlock");
+  Note(TextOf(self->name) + " unlock");
   return 1;
 }
 
 void* OpenPort(Object* /*self*/, const char* name) {
-  Note("open " + Text(name));
+  Note("open " + TextOf(name));
   return &port;
 }
-void ReleasePort(Object* /*self*/, Object* released) { Note("release " + Text(released->name)); }
+void ReleasePort(Object* /*self*/, Object* released) { Note("release " + TextOf(released->name)); }
 
 int SetupPort(Object* /*self*/, int baudrate, int parity, int bits, int stop, int mode) {
   Note("setup " + std::to_string(baudrate) + " " + std::to_string(parity) + " " +
@@ -143,36 +143,36 @@ int Receive(Object* /*self*/, unsigned char* byte, int timeoutMs, int argument) 
 }
 
 void* ConvertStorage(Object* /*self*/, const char* name) {
-  Note("convert " + Text(name));
+  Note("convert " + TextOf(name));
   return extendedStorage ? &storage2 : nullptr;
 }
 void SetString(Object* /*self*/, const char* ident, const char* key, const char* text) {
-  Note("set string " + Text(ident) + " " + Text(key) + " " + Text(text));
+  Note("set string " + TextOf(ident) + " " + TextOf(key) + " " + TextOf(text));
 }
 void SetBoolean(Object* /*self*/, const char* ident, const char* key, bool value) {
-  Note("set boolean " + Text(ident) + " " + Text(key) + (value ? " true" : " false"));
+  Note("set boolean " + TextOf(ident) + " " + TextOf(key) + (value ? " true" : " false"));
 }
 void SetInteger(Object* /*self*/, const char* ident, const char* key, int value) {
-  Note("set integer " + Text(ident) + " " + Text(key) + " " + std::to_string(value));
+  Note("set integer " + TextOf(ident) + " " + TextOf(key) + " " + std::to_string(value));
 }
 const char* GetString(Object* /*self*/, const char* ident, const char* key) {
-  Note("get string " + Text(ident) + " " + Text(key));
+  Note("get string " + TextOf(ident) + " " + TextOf(key));
   return "03";
 }
 bool GetBoolean(Object* /*self*/, const char* ident, const char* key) {
-  Note("get boolean " + Text(ident) + " " + Text(key));
+  Note("get boolean " + TextOf(ident) + " " + TextOf(key));
   return false;
 }
 int GetInteger(Object* /*self*/, const char* ident, const char* key) {
-  Note("get integer " + Text(ident) + " " + Text(key));
+  Note("get integer " + TextOf(ident) + " " + TextOf(key));
   return 4800;
 }
 int Exists(Object* /*self*/, const char* /*ident*/, const char* key) {
-  const std::string name = Text(key);
+  const std::string name = TextOf(key);
   return name == "baud" || name == "rx_suffix" || name == "hex_tokens" ? 1 : 0;
 }
 int GetStringInto(Object* /*self*/, const char* ident, const char* key, char* buffer, int size) {
-  Note("get string into " + Text(ident) + " " + Text(key) + " " + std::to_string(size));
+  Note("get string into " + TextOf(ident) + " " + TextOf(key) + " " + std::to_string(size));
   std::memcpy(buffer, "03", 3);
   return 1;
 }
