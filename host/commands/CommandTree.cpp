@@ -28,6 +28,8 @@
 #include "host/commands/TermCommand.h"
 #include "host/commands/WriteCommand.h"
 #include "host/sim/SimRun.h"
+#include "host/text/Output.h"
+#include "host/text/Utf8Text.h"
 
 namespace {
 
@@ -72,6 +74,17 @@ std::unique_ptr<Command> Make() {
   return std::make_unique<CommandOf<Options, kAdd, kRun>>();
 }
 
+// CLI11's words in the tool's own frame, with the way to the help of the command that was meant.
+std::string WhatIsWrong(const CLI::App* app, const CLI::Error& error) {
+  std::string name = "loka";
+  const CLI::App* command = app;
+  while (!command->get_subcommands().empty()) {
+    command = command->get_subcommands().front();
+    name += " " + command->get_name();
+  }
+  return "loka: " + PrintableUtf8(error.what()) + "\nloka: " + name + " --help tells more\n";
+}
+
 // Options of every command may stand in front of its name as well; the parser wants them behind it.
 void MoveBehindName(std::vector<std::string>* words) {
   constexpr std::string_view kWithValue[] = {"--plugin", "--profile", "--color"};
@@ -105,6 +118,7 @@ CommandTree::CommandTree()
   app_->footer(kFooter);
   app_->require_subcommand(0, 1);
   app_->formatter(std::make_shared<HelpText>());
+  app_->failure_message(WhatIsWrong);
   Add(kEveryday, Make<SubOptions, AddSub, RunSub>());
   Add(kEveryday, Make<SendOptions, AddSend, RunSend>());
   Add(kEveryday, Make<AskOptions, AddAsk, RunAsk>());
@@ -154,6 +168,10 @@ bool CommandTree::Parse(std::vector<std::string> words, int* status) {
   Entry* const entry = words.empty() ? nullptr : Find(words.front());
   if (entry != nullptr) {
     entry->command->Prepare(*entry->app, &words);
+  } else if (!words.empty() && words.front().rfind('-', 0) != 0) {
+    TellUser("there is no command '" + PrintableUtf8(words.front()) + "'; loka --help lists them");
+    *status = static_cast<int>(ExitStatus::kUsage);
+    return false;
   }
   // CLI11 takes a vector from its back.
   std::reverse(words.begin(), words.end());

@@ -56,7 +56,8 @@ void AddSub(CLI::App* app, SubOptions* options) {
       sub->add_flag("-x,--hex-output", options->isHex, "Tokens as hexadecimal");
   sub->add_flag("-X,--dump", options->isDump, "Frames as hexadecimal and characters")
       ->excludes(json)
-      ->excludes(format);
+      ->excludes(format)
+      ->excludes(hex);
   json->excludes(format)->excludes(hex);
   hex->excludes(format);
   sub->add_flag("-t,--time", options->hasTime, "Time of day in front of each line")->excludes(json);

@@ -5,9 +5,11 @@
 #include <cerrno>
 #include <cstddef>
 #include <cstring>
+#include <filesystem>
 #include <fstream>
 #include <iostream>
 #include <sstream>
+#include <system_error>
 
 #include "host/framing/ConfigText.h"
 
@@ -73,6 +75,9 @@ bool ReadWord(const std::string& word, std::string* text, std::string* error) {
     isShort = ReadAll(&std::cin, text);
   } else if (word.find_first_of("= \t\n") != std::string::npos) {
     *text = word;
+  } else if (std::error_code code; std::filesystem::is_character_file(word, code)) {
+    *error = word + ": a device, not a configuration; give the text, a file of it, or -";
+    return false;
   } else {
     std::ifstream file(word, std::ios::binary);
     if (file) {

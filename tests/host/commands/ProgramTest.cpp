@@ -61,6 +61,37 @@ TEST(Program, WrongUsageIsStatus2) {
   }
 }
 
+TEST(Program, WrongUsageSaysWhatIsWrongAndWhereToLook) {
+  struct Case {
+    std::vector<std::string> words;
+    std::string errors;
+  };
+  const std::vector<Case> cases = {
+      {{"bogus"}, "loka: there is no command 'bogus'; loka --help lists them\n"},
+      {{"bo\x1b[31mgus"}, "loka: there is no command 'bo\\x1B[31mgus'; loka --help lists them\n"},
+      {{"--bogus"},
+       "loka: The following argument was not expected: --bogus\nloka: loka --help tells more\n"},
+      {{"config", "show"}, "loka: CONFIG is required\nloka: loka config show --help tells more\n"},
+      {{"sub", "/dev/x", "-x", "-X"},
+       "loka: --hex-output excludes --dump\nloka: loka sub --help tells more\n"}};
+  for (const Case& entry : cases) {
+    ProgramRun run(entry.words);
+    EXPECT_EQ(run.Output(), "");
+    EXPECT_EQ(run.Errors(), entry.errors);
+    EXPECT_EQ(run.Status(), 2);
+  }
+}
+
+TEST(Program, DeviceIsNoConfiguration) {
+  const PseudoTerminal line;
+  ProgramRun run({"config", "check", line.Path()});
+  EXPECT_EQ(run.Output(), "");
+  EXPECT_EQ(run.Errors(),
+            "loka: " + line.Path() +
+                ": a device, not a configuration; give the text, a file of it, or -\n");
+  EXPECT_NE(run.Status(), 0);
+}
+
 TEST(Program, MissingPluginIsStatus3) {
   auto arguments = SubArguments("/dev/x", "");
   arguments.insert(arguments.end(), {"--plugin", "/nowhere/lib.so"});
