@@ -29,7 +29,7 @@ fuzz() {
   local target=$1 verdict=ok
   local learnt=$build_dir/learnt/$target log=$build_dir/learnt/$target.log
   mkdir -p "$learnt"
-  nice -n 19 "$build_dir/fuzz_$target" -max_total_time="$seconds" -timeout=25 -max_len=1024 \
+  nice -n 19 "$build_dir/fuzz_$target" -max_total_time="$seconds" -timeout=120 -max_len=1024 \
     -print_final_stats=1 -artifact_prefix="$project_dir/fuzz/corpus/$target/" \
     "$learnt" "$project_dir/fuzz/corpus/$target" >"$log" 2>&1 || verdict=FAILED
   printf '%-10s %s: %s inputs in %s s, %s edges covered, %s inputs learnt\n' "$target" "$verdict" \
