@@ -18,6 +18,9 @@ set(CMAKE_FIND_ROOT_PATH_MODE_LIBRARY ONLY)
 set(CMAKE_FIND_ROOT_PATH_MODE_INCLUDE ONLY)
 set(CMAKE_FIND_ROOT_PATH_MODE_PACKAGE ONLY)
 
+# Test programs are asked for their cases when the tests run: a build needs no emulator.
+set(CMAKE_GTEST_DISCOVER_TESTS_DISCOVERY_MODE PRE_TEST)
+
 # Programs for the target run under user-mode emulation.
 set(CMAKE_CROSSCOMPILING_EMULATOR qemu-arm -L /usr/${LOKA_PANEL_TRIPLET} -E
                                   LD_LIBRARY_PATH=${CMAKE_BINARY_DIR}/target/usr/lib/${LOKA_PANEL_TRIPLET})
