@@ -36,11 +36,12 @@ void GroupParameterReplacer::set(const std::string& name, int node, bool value) 
 }
 
 template <typename Field>
-bool GroupParameterReplacer::Find(const std::string& name, int node, Field Variant::*field,
+bool GroupParameterReplacer::Find(std::string_view name, int node, Field Variant::*field,
                                   Field& out) const {
-  const std::string key = makeFullName(name, node);
+  // A name without a node is the key itself and is not copied.
+  const std::string withNode = node == kNoNode ? "" : makeFullName(std::string(name), node);
   const LeafLock lock(mutex_);
-  const auto staged = values_.find(key);
+  const auto staged = values_.find(node == kNoNode ? name : std::string_view(withNode));
   if (staged == values_.end()) {
     return false;
   }
@@ -48,15 +49,15 @@ bool GroupParameterReplacer::Find(const std::string& name, int node, Field Varia
   return true;
 }
 
-bool GroupParameterReplacer::get(const std::string& name, int node, std::string& out) const {
+bool GroupParameterReplacer::get(std::string_view name, int node, std::string& out) const {
   return Find(name, node, &Variant::stringValue, out);
 }
 
-bool GroupParameterReplacer::get(const std::string& name, int node, int& out) const {
+bool GroupParameterReplacer::get(std::string_view name, int node, int& out) const {
   return Find(name, node, &Variant::intValue, out);
 }
 
-bool GroupParameterReplacer::get(const std::string& name, int node, bool& out) const {
+bool GroupParameterReplacer::get(std::string_view name, int node, bool& out) const {
   return Find(name, node, &Variant::boolValue, out);
 }
 

@@ -1,8 +1,10 @@
 // SPDX-License-Identifier: Apache-2.0
 #pragma once
 
+#include <functional>
 #include <map>
 #include <string>
+#include <string_view>
 
 #include "model/ParameterValue.h"
 #include "protlib/LeafMutex.h"
@@ -39,20 +41,20 @@ class GroupParameterReplacer {
 
   // The staged value; false, with `out` untouched, when nothing is staged. A value staged with
   // another type gives its zero value of the asked one.
-  bool get(const std::string& name, int node, std::string& out) const;
-  bool get(const std::string& name, int node, int& out) const;
-  bool get(const std::string& name, int node, bool& out) const;
+  bool get(std::string_view name, int node, std::string& out) const;
+  bool get(std::string_view name, int node, int& out) const;
+  bool get(std::string_view name, int node, bool& out) const;
 
   // Makes every staged value of the node the active one, in the order of the keys; with `persist`
   // also stores it permanently.
   void activate(ParameterReplacer& target, int node, bool persist) const;
 
  private:
-  using Values = std::map<std::string, Variant>;
+  using Values = std::map<std::string, Variant, std::less<>>;
 
   void Stage(Variant value);
   template <typename Field>
-  bool Find(const std::string& name, int node, Field Variant::*field, Field& out) const;
+  bool Find(std::string_view name, int node, Field Variant::*field, Field& out) const;
   Values Snapshot() const;
 
   mutable LeafMutex mutex_;

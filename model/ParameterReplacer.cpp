@@ -43,17 +43,21 @@ std::string ParameterReplacer::makeFullName(const std::string& name, int node) {
 }
 
 template <typename Load>
-ParameterReplacer::Variant ParameterReplacer::LookUp(const std::string& name, int node,
+ParameterReplacer::Variant ParameterReplacer::LookUp(std::string_view name, int node,
                                                      const Variant& fallback, Load load) {
-  const std::string key = makeFullName(name, node);
+  // A name without a node is the key itself and is not copied for a value that is cached.
+  std::string key = node == kNoNode ? "" : makeFullName(std::string(name), node);
   std::string ident;
   {
     const LeafLock lock(mutex_);
-    const auto cached = values_.find(key);
+    const auto cached = values_.find(node == kNoNode ? name : std::string_view(key));
     if (cached != values_.end()) {
       return cached->second;
     }
     ident = ident_;
+  }
+  if (node == kNoNode) {
+    key = name;
   }
   Variant value = fallback;
   IPermanentStorage* const storage = piPermanentStorage;
@@ -64,7 +68,7 @@ ParameterReplacer::Variant ParameterReplacer::LookUp(const std::string& name, in
   return values_.emplace(key, value).first->second;
 }
 
-void ParameterReplacer::get(const std::string& name, int node, const std::string& defaultValue,
+void ParameterReplacer::get(std::string_view name, int node, const std::string& defaultValue,
                             std::string& out) {
   const Variant fallback{kStringParameter, false, 0, defaultValue};
   out = LookUp(name, node, fallback,
@@ -74,7 +78,7 @@ void ParameterReplacer::get(const std::string& name, int node, const std::string
             .stringValue;
 }
 
-void ParameterReplacer::get(const std::string& name, int node, int defaultValue, int& out) {
+void ParameterReplacer::get(std::string_view name, int node, int defaultValue, int& out) {
   const Variant fallback{kIntegerParameter, false, defaultValue, {}};
   out = LookUp(name, node, fallback,
                [](IPermanentStorage& storage, const char* ident, const char* key, Variant& value) {
@@ -83,7 +87,7 @@ void ParameterReplacer::get(const std::string& name, int node, int defaultValue,
             .intValue;
 }
 
-void ParameterReplacer::get(const std::string& name, int node, bool defaultValue, bool& out) {
+void ParameterReplacer::get(std::string_view name, int node, bool defaultValue, bool& out) {
   const Variant fallback{kBooleanParameter, defaultValue, 0, {}};
   out = LookUp(name, node, fallback,
                [](IPermanentStorage& storage, const char* ident, const char* key, Variant& value) {

@@ -1,8 +1,10 @@
 // SPDX-License-Identifier: Apache-2.0
 #pragma once
 
+#include <functional>
 #include <map>
 #include <string>
+#include <string_view>
 
 #include "model/ParameterValue.h"
 #include "protlib/LeafMutex.h"
@@ -30,9 +32,9 @@ class ParameterReplacer {
   static std::string makeFullName(const std::string& name, int node);
 
   // Looks a value up. A cached value of another type gives its zero value of the asked one.
-  void get(const std::string& name, int node, const std::string& defaultValue, std::string& out);
-  void get(const std::string& name, int node, int defaultValue, int& out);
-  void get(const std::string& name, int node, bool defaultValue, bool& out);
+  void get(std::string_view name, int node, const std::string& defaultValue, std::string& out);
+  void get(std::string_view name, int node, int defaultValue, int& out);
+  void get(std::string_view name, int node, bool defaultValue, bool& out);
 
   // Replaces the active value of a key; with `persist` also writes it to permanent storage, when
   // the host has one.
@@ -40,11 +42,11 @@ class ParameterReplacer {
 
  private:
   template <typename Load>
-  Variant LookUp(const std::string& name, int node, const Variant& fallback, Load load);
+  Variant LookUp(std::string_view name, int node, const Variant& fallback, Load load);
   void Store(const std::string& key, const Variant& value) const;
   std::string Ident() const;
 
   mutable LeafMutex mutex_;
   std::string ident_ LOKA_GUARDED_BY(mutex_);
-  std::map<std::string, Variant> values_ LOKA_GUARDED_BY(mutex_);
+  std::map<std::string, Variant, std::less<>> values_ LOKA_GUARDED_BY(mutex_);
 };
