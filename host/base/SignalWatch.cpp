@@ -21,7 +21,7 @@
 namespace {
 
 // More than the driver's task and a port with bytes to send may take together.
-constexpr int kEndLimitMs = 8000;
+constexpr int kCleanEndLimitMs = 8000;
 
 // What must be put back whatever happens is registered with at_quick_exit.
 [[noreturn]] void EndAtOnce(int signalNumber) {
@@ -64,7 +64,7 @@ void SignalWatch::State::Run() {
       EndAtOnce(signalNumber);
     }
     firstSignal = signalNumber;
-    limit = Deadline::After(kEndLimitMs);
+    limit = Deadline::After(kCleanEndLimitMs);
     onSignal(signalNumber);
   }
 }

@@ -14,10 +14,10 @@
 
 namespace {
 
-constexpr int kForeverMs = INT_MAX;
+constexpr int kNoReaderLimitMs = INT_MAX;
 constexpr int kLastWordsMs = 200;
 // A pipe that is ready takes at least so many bytes at once (pipe(7)).
-constexpr std::size_t kPieceBytes = PIPE_BUF;
+constexpr std::size_t kLinePieceBytes = PIPE_BUF;
 
 }  // namespace
 
@@ -62,7 +62,7 @@ void BackgroundLines::Run() {
   bool isLast = false;
   while (!isLast) {
     pollfd wait = {wake_.FileDescriptor(), POLLIN, 0};
-    (void)Deadline::After(kForeverMs).Poll(&wait, 1);
+    (void)Deadline::After(kNoReaderLimitMs).Poll(&wait, 1);
     wake_.Clear();
     isLast = IsEnding();
     Put(Take());
@@ -75,7 +75,7 @@ bool BackgroundLines::AwaitReader() const {
     const bool isEnding = IsEnding();
     std::array<pollfd, 2> waits = {
         {{fileDescriptor_, POLLOUT, 0}, {ending_.FileDescriptor(), POLLIN, 0}}};
-    (void)Deadline::After(isEnding ? kLastWordsMs : kForeverMs)
+    (void)Deadline::After(isEnding ? kLastWordsMs : kNoReaderLimitMs)
         .Poll(waits.data(), isEnding ? 1 : 2);
     if (waits[0].revents != 0 || isEnding) {
       return waits[0].revents != 0;
@@ -86,7 +86,7 @@ bool BackgroundLines::AwaitReader() const {
 void BackgroundLines::Put(const std::string& bytes) const {
   std::size_t written = 0;
   while (written < bytes.size() && AwaitReader()) {
-    const std::size_t piece = std::min(bytes.size() - written, kPieceBytes);
+    const std::size_t piece = std::min(bytes.size() - written, kLinePieceBytes);
     const ssize_t count = write(fileDescriptor_, bytes.data() + written, piece);
     if (count < 0 && errno != EINTR && errno != EAGAIN) {
       return;
