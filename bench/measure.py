@@ -16,6 +16,8 @@ import tempfile
 import time
 import tty
 
+import page
+
 PREFIX, SUFFIX = b"\x02", b"\x03"
 MOST_UNREAD = 5000  # tokens on their way to a reader with a queue of 10000
 HERE = os.path.dirname(os.path.abspath(__file__))
@@ -280,7 +282,7 @@ def table(title, results, columns, base):
     return "\n".join(lines) + "\n"
 
 
-QUESTIONS = ("throughput", "latency", "rates", "start", "soak")
+QUESTIONS = ("throughput", "latency", "rates", "start", "soak", "memory", "profile")
 
 
 def soak(reader, tokens):
@@ -294,16 +296,96 @@ def soak(reader, tokens):
     return result
 
 
+def in_memory(build, is_quick):
+    """Figures of bench_driver by question and case: CPU nanoseconds and allocations."""
+    command = [os.path.join(build, "bench_driver"), "--benchmark_format=json",
+               f"--benchmark_min_time={0.005 if is_quick else 0.05}",
+               f"--benchmark_repetitions={1 if is_quick else 5}"]
+    report = json.loads(subprocess.run(command, stdout=subprocess.PIPE, stderr=subprocess.DEVNULL,
+                                       check=True).stdout)
+    cases = {}
+    for row in report["benchmarks"]:
+        if row.get("error_occurred"):
+            raise RuntimeError(f"{row['name']}: {row['error_message']}")
+        if row["run_type"] != "iteration":
+            continue
+        unit = {"ns": 1, "us": 1e3, "ms": 1e6}[row["time_unit"]]
+        case = cases.setdefault(row["run_name"], {"times": []})
+        case["times"].append(row["cpu_time"] * unit)
+        case["per"] = row["per"]
+        case["allocations"] = row["allocations"]
+    for case in cases.values():
+        case["ns"] = statistics.median(case.pop("times"))
+    return cases
+
+
+def instructions(build, which, payload, tokens):
+    """Instructions of so many tokens: altogether and by function (callgrind)."""
+    with tempfile.TemporaryDirectory(prefix="loka-bench-") as folder:
+        out = os.path.join(folder, "callgrind")
+        subprocess.run(["valgrind", "--tool=callgrind", f"--callgrind-out-file={out}",
+                        os.path.join(build, "bench_driver"), "profile", which, str(payload),
+                        str(tokens)], check=True, stdout=subprocess.DEVNULL,
+                       stderr=subprocess.DEVNULL)
+        text = subprocess.run(["callgrind_annotate", "--auto=no", "--threshold=100", out], check=True,
+                              stdout=subprocess.PIPE, stderr=subprocess.DEVNULL,
+                              text=True).stdout
+    functions = {}
+    total = 0
+    for line in text.splitlines():
+        words = line.split()
+        if len(words) < 2 or not words[0].replace(",", "").isdigit():
+            continue
+        count = int(words[0].replace(",", ""))
+        if "PROGRAM TOTALS" in line:
+            total = count
+        elif ":" in line:
+            name = line.split(":", 1)[1].replace("(anonymous namespace)::", "").split(" [")[0]
+            name = name.split("(")[0].split("@@")[0].replace("[abi:cxx11]", "").strip()
+            name = name.replace("std::__cxx11::basic_string<char, std::char_traits<char>, "
+                                "std::allocator<char> >", "std::string")
+            functions[name] = functions.get(name, 0) + count
+    return total, functions
+
+
+def profile(build, is_quick):
+    """Instructions a byte, from the difference of a long and a short run."""
+    short, long = (100, 300) if is_quick else (1000, 3000)
+    result = {}
+    for payload in (16, 202):
+        for which in ("lean", "driver"):
+            few, few_by_name = instructions(build, which, payload, short)
+            many, many_by_name = instructions(build, which, payload, long)
+            bytes_more = (long - short) * (payload + 2)
+            by_name = {name: (count - few_by_name.get(name, 0)) / bytes_more
+                       for name, count in many_by_name.items()}
+            result[f"{which}/{payload}"] = {
+                "total": (many - few) / bytes_more,
+                "functions": {name: count for name, count in by_name.items() if count >= 0.5}}
+    return result
+
+
 def main():
     parser = argparse.ArgumentParser(description=__doc__)
-    parser.add_argument("--build", required=True, help="build folder with the readers")
+    parser.add_argument("--build", default="build/bench", help="build folder with the readers")
     parser.add_argument("--quick", action="store_true", help="few rounds: shows that all of it runs")
     parser.add_argument("--only", default=",".join(QUESTIONS), help="questions, by commas")
     parser.add_argument("--readers", help="names or parts of names, by commas; all by default")
     parser.add_argument("--rounds", type=int)
     parser.add_argument("--tokens", type=int)
+    parser.add_argument("--scale", type=float, default=1,
+                        help="of the time that latency and rates take (1)")
+    parser.add_argument("--page", help="Markdown file for everything, drawings beside it in benchmarks/")
+    parser.add_argument("--from-json", help="write the page from figures of an earlier run")
     parser.add_argument("--json", help="file for every figure")
     options = parser.parse_args()
+    if options.from_json:
+        with open(options.from_json) as file:
+            earlier = json.load(file)
+        page.write(options.page, earlier["figures"], earlier["tables"], earlier["conditions"],
+                   summary)
+        return
+    conditions = page.conditions()
     only = options.only.split(",")
     readers = all_readers(options.build)
     if options.readers:
@@ -311,10 +393,15 @@ def main():
         readers = [reader for reader in readers if any(part in reader.name for part in wanted)]
     rounds = options.rounds or (1 if options.quick else 7)
     figures = {}
+    tables = {}
+
+    def show(key, text):
+        tables[key] = text
+        print(text, flush=True)
 
     def ask(key, title, measure, columns, base, rounds=rounds, asked=readers):
         figures[key] = in_turn(asked, rounds, measure)
-        print(table(title, figures[key], columns, base), flush=True)
+        show(key, table(title, figures[key], columns, base))
 
     full = "obliged loop, full"
     floor = "read and memchr"
@@ -327,14 +414,14 @@ def main():
                 [("CPU ns a token", "cpu_per_token"), ("tokens/s", "tokens_a_second")], full,
                 asked=readers if payload == 16 else without_slow)
     if "latency" in only:
-        count = 50 if options.quick else 500
+        count = int((50 if options.quick else 500) * options.scale)
         columns = [("p50 µs", "p50_us"), ("p99 µs", "p99_us")]
         ask("latency_idle", "Latency, idle machine", latency(count), columns, floor)
         with BusyMachine():
             ask("latency_busy", "Latency, busy machine", latency(count), columns, floor,
                 rounds=min(rounds, 3))
     if "rates" in only:
-        seconds = 0.5 if options.quick else 4
+        seconds = (0.5 if options.quick else 3) * options.scale
         columns = [("CPU %", "cpu_percent"), ("context switches/s", "switches_a_second")]
         for baud in (9600, 115200):
             ask(f"rate_{baud}", f"A line of {baud} baud, 16-byte tokens one after the other",
@@ -351,11 +438,21 @@ def main():
         for reader in loka:
             result = soak(reader, 10000 if options.quick else 1000000)
             figures["soak"] = result
-            print(f"Soak: {result['tokens']} tokens, {result['lost']} lost, resident "
-                  f"{result['early_kib']} KiB after a tenth, {result['late_kib']} KiB at the end\n")
+            show("soak", f"Soak: {result['tokens']:,} tokens, {result['lost']} lost, resident "
+                 f"{result['early_kib']} KiB after a tenth, {result['late_kib']} KiB at the end.\n")
+    if "memory" in only:
+        figures["memory"] = in_memory(options.build, options.quick)
+        for key, text in page.memory_tables(figures["memory"]).items():
+            show(key, text)
+    if "profile" in only:
+        figures["profile"] = profile(options.build, options.quick)
+        show("profile", page.profile_table(figures["profile"]))
+    if options.page:
+        page.write(options.page, figures, tables, conditions, summary)
     if options.json:
         with open(options.json, "w") as file:
-            json.dump(figures, file, indent=1)
+            json.dump({"figures": figures, "tables": tables, "conditions": conditions}, file,
+                      indent=1)
 
 
 if __name__ == "__main__":

@@ -4,7 +4,7 @@
 # missing, builds, runs every reader in turn and prints one table a question.
 #
 #   scripts/bench.sh           everything, less than 30 minutes; writes docs/benchmarks.md and its
-#                              drawings
+#                              drawings in docs/benchmarks/
 #   scripts/bench.sh --quick   every part once and briefly, less than 3 minutes; shows that all of it
 #                              works and judges no figure
 #
@@ -14,7 +14,7 @@
 . "$(dirname "$0")/lib.sh"
 
 bench_packages=(libboost-dev libgensio-dev libserialport-dev libbenchmark-dev python3
-  python3-serial)
+  python3-serial valgrind)
 build_dir=${LOKA_BENCH_BUILD:-$project_dir/build/bench}
 node_dir=$build_dir/node
 
@@ -34,6 +34,11 @@ if [ ! -d "$node_dir/node_modules/serialport" ]; then
   (cd "$node_dir" && npm install --no-audit --no-fund --silent serialport)
 fi
 
+more=("$@")
+if [ $# -eq 0 ]; then
+  more=(--page "$project_dir/docs/benchmarks.md" --json "$build_dir/benchmarks.json")
+fi
+
 say "Measuring"
-LOKA_BENCH_NODE=$node_dir python3 "$project_dir/bench/measure.py" --build "$build_dir" "$@"
+LOKA_BENCH_NODE=$node_dir python3 "$project_dir/bench/measure.py" --build "$build_dir" "${more[@]}"
 say "bench.sh: done"

@@ -376,9 +376,34 @@ void RegisterGrowth() {
   each("frame length", GrowToken, {3, 10, 100, 300, 1000});
 }
 
+// So many tokens by the driver or the lean loop and nothing else, for a profiler that counts.
+int Profile(const std::string& which, std::size_t payload, int tokens) {
+  if (which == "lean") {
+    EndlessPort line;
+    line.Play(Frame(payload), false);
+    const auto semaphore = MakeMutexSemaphore();
+    ObligedLoop loop(&line, semaphore.get(), ObligedLoop::Compare::kLastByteFirst);
+    std::string_view token;
+    for (int i = 0; i < tokens; ++i) {
+      benchmark::DoNotOptimize(loop.Next(&token));
+    }
+    return 0;
+  }
+  Bench bench;
+  bench.Line().Play(Frame(payload), false);
+  for (int i = 0; i < tokens; ++i) {
+    bench.Driver().Task();
+  }
+  return 0;
+}
+
 }  // namespace
 
+// "profile driver|lean PAYLOAD TOKENS" runs that alone.
 int main(int argumentCount, char** arguments) {
+  if (argumentCount == 5 && std::string(arguments[1]) == "profile") {
+    return Profile(arguments[2], std::stoul(arguments[3]), std::stoi(arguments[4]));
+  }
   RegisterBytes();
   RegisterTags();
   RegisterCommands();
