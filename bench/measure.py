@@ -16,7 +16,8 @@ import tempfile
 import time
 import tty
 
-import page
+sys.dont_write_bytecode = True  # nothing of a run stays in the sources
+import page  # noqa: E402
 
 PREFIX, SUFFIX = b"\x02", b"\x03"
 MOST_UNREAD = 5000  # tokens on their way to a reader with a queue of 10000
@@ -28,7 +29,7 @@ class Reader:
         self.name = name
         self.command = command
         self.counts = counts  # keeps a count of what it has taken where the device can see it
-        self.heavy = heavy    # an interpreter: fewer tokens do
+        self.heavy = heavy    # so slow that fewer tokens do
 
     def __repr__(self):
         return self.name
@@ -46,10 +47,10 @@ def all_readers(build):
         ("libserialport", program("read_libserialport"), True, False),
         ("gensio", program("read_gensio"), True, False),
         ("Boost.Asio", program("read_asio"), True, False),
-        ("node-serialport", [["node", os.path.join(HERE, "reader/read_node.js")], ()], False, True),
+        ("node-serialport", [["node", os.path.join(HERE, "reader/read_node.js")], ()], False, False),
         ("pyserial packetizer",
          [["/usr/bin/python3", os.path.join(HERE, "reader/read_pyserial.py")], ("packetizer",)],
-         False, True),
+         False, False),
         ("pyserial read_until", [["/usr/bin/python3", os.path.join(HERE, "reader/read_pyserial.py")], ()],
          False, True),
         ("obliged loop, bare", program("read_obliged", "bare"), True, False),
@@ -385,7 +386,8 @@ def main():
         page.write(options.page, earlier["figures"], earlier["tables"], earlier["conditions"],
                    summary)
         return
-    conditions = page.conditions()
+    conditions = page.conditions(f"{'quick' if options.quick else 'full'}, rounds "
+                                 f"{options.rounds or 'as usual'}, scale {options.scale:g}")
     only = options.only.split(",")
     readers = all_readers(options.build)
     if options.readers:

@@ -2,6 +2,7 @@
 """Tables of what was measured in memory, the curves, and docs/benchmarks.md."""
 import os
 import platform
+import re
 import subprocess
 import time
 
@@ -152,7 +153,7 @@ def _package(name):
     return _output("dpkg-query", "-W", "-f=${Version}", name)
 
 
-def conditions():
+def conditions(how):
     processor = "unknown"
     with open("/proc/cpuinfo") as info:
         for line in info:
@@ -163,6 +164,7 @@ def conditions():
     serialport = _output("node", "-p",
                          f"require('{node}/node_modules/serialport/package.json').version")
     return [
+        ("Run", how),
         ("Date", time.strftime("%Y-%m-%d")),
         ("Commit", _output("git", "-C", os.path.dirname(os.path.abspath(__file__)), "rev-parse",
                            "--short", "HEAD")),
@@ -261,6 +263,8 @@ def write(path, figures, tables, measured_under, summary):
         drawings.append(f"![{title}: ns a {unit}, by {axis}](benchmarks/{name})")
     tables["drawings"] = "\n".join(drawings) + "\n"
     for key, value in tables.items():
-        text = text.replace("{{" + key + "}}\n", value)
+        text = text.replace("{{" + key + "}}\n", value + "\n")
+    text = re.sub(r"\{\{[a-z_0-9]+\}\}\n", "Not measured in this run.\n\n", text)
+    text = re.sub(r"\n{3,}", "\n\n", text)
     with open(path, "w") as file:
-        file.write(text)
+        file.write(text.rstrip("\n") + "\n")
