@@ -368,7 +368,7 @@ def profile(build, is_quick):
 
 def main():
     parser = argparse.ArgumentParser(description=__doc__)
-    parser.add_argument("--build", default="build/bench", help="build folder with the readers")
+    parser.add_argument("--build", default="build/release", help="build folder with the readers")
     parser.add_argument("--quick", action="store_true", help="few rounds: shows that all of it runs")
     parser.add_argument("--only", default=",".join(QUESTIONS), help="questions, by commas")
     parser.add_argument("--readers", help="names or parts of names, by commas; all by default")

@@ -9,13 +9,13 @@
 #                              works and judges no figure
 #
 # Other options go to bench/measure.py (--help lists them). LOKA_BENCH_BUILD names another build
-# folder than build/bench.
+# folder than build/release.
 
 . "$(dirname "$0")/lib.sh"
 
 bench_packages=(libboost-dev libgensio-dev libserialport-dev libbenchmark-dev python3
   python3-serial valgrind)
-build_dir=${LOKA_BENCH_BUILD:-$project_dir/build/bench}
+build_dir=${LOKA_BENCH_BUILD:-$project_dir/build/release}
 node_dir=$build_dir/node
 
 need_packages "${build_packages[@]}" "${bench_packages[@]}"
@@ -25,7 +25,7 @@ command -v npm >/dev/null || need_packages npm
 say "Building into $build_dir"
 (
   cd "$project_dir"
-  cmake --preset release -B "$build_dir" -DLOKA_BUILD_BENCH=ON -DLOKA_BUILD_TESTS=OFF >/dev/null
+  cmake --preset release -B "$build_dir" -DLOKA_BUILD_BENCH=ON >/dev/null
 )
 cmake --build "$build_dir" --target bench_programs
 if [ ! -d "$node_dir/node_modules/serialport" ]; then

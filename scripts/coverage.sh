@@ -46,5 +46,5 @@ report --txt "$build_dir/lines.txt" --json-summary "$build_dir/coverage.json"
 report --branches --txt "$build_dir/branches.txt"
 cat "$build_dir/lines.txt" "$build_dir/branches.txt"
 report --fail-under-line "$lines_percent" --fail-under-branch "$branches_percent" \
-  --print-summary --txt /dev/null || die "coverage.sh: below $lines_percent % of the lines or $branches_percent % of the branches"
+  --print-summary --txt "$build_dir/summary.txt" || die "coverage.sh: below $lines_percent % of the lines or $branches_percent % of the branches"
 say "coverage.sh: at least $lines_percent % of the lines and $branches_percent % of the branches"

@@ -9,6 +9,7 @@
 #include <string_view>
 
 #include "host/base/ExitStatus.h"
+#include "host/commands/CommandFailure.h"
 #include "host/instance/LocalInstance.h"
 #include "host/runtime/HostEvents.h"
 #include "host/runtime/SessionConsole.h"
@@ -37,17 +38,12 @@ bool DescribesDriver(const std::string& line) {
   return word == "help" || word == "xml" || word == "getmaxtm";
 }
 
-std::string Join(const std::vector<std::string>& words) {
+std::string JoinWords(const std::vector<std::string>& words) {
   std::string line;
   for (const std::string& word : words) {
     line += (line.empty() ? "" : " ") + word;
   }
   return line;
-}
-
-int UsageError(const std::string& text) {
-  TellUser(text);
-  return static_cast<int>(ExitStatus::kUsage);
 }
 
 // A reply may hold bytes of a device, which could steer a terminal; programs get it as it stands.
@@ -111,9 +107,10 @@ int RunOn(Instance* instance, const std::string& line) {
 // The running instance, else one of its own.
 int RunWithPort(const InstanceAccess& access, const std::string& line) {
   if (access.options.portWords.empty() || access.options.configuration.empty()) {
-    return UsageError("'" + PrintableUtf8(CommandWord(line)) +
-                      "' needs a running instance, or a port; only help, info, xml, "
-                      "lasterror, getmaxtm and deletetags do without");
+    return Fail(ExitStatus::kUsage,
+                "'" + PrintableUtf8(CommandWord(line)) +
+                    "' needs a running instance, or a port; only help, info, xml, "
+                    "lasterror, getmaxtm and deletetags do without");
   }
   Answer answer;
   const auto instance = BeginInstance(access, &answer);
@@ -176,9 +173,9 @@ int RunCmd(CmdOptions* options) {
   InstanceAccess& access = options->access;
   access.acknowledges = false;
   access.connects = false;
-  const std::string line = Join(options->words);
+  const std::string line = JoinWords(options->words);
   if (line.empty()) {
-    return UsageError("a console command is missing; loka cmd help lists them");
+    return Fail(ExitStatus::kUsage, "a console command is missing; loka cmd help lists them");
   }
   Answer answer;
   if (!Resolve(&access, &answer)) {

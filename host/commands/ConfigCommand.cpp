@@ -6,6 +6,7 @@
 #include <cstdio>
 
 #include "host/base/ExitStatus.h"
+#include "host/commands/CommandFailure.h"
 #include "host/commands/ProfileFile.h"
 #include "host/commands/ProfileUse.h"
 #include "host/document/DescriptionBlock.h"
@@ -20,11 +21,6 @@
 #include "interfaces/IProtocol5.h"
 
 namespace {
-
-int Fail(ExitStatus status, const std::string& text) {
-  TellUser(text);
-  return static_cast<int>(status);
-}
 
 void AddInput(CLI::App* command, ConfigOptions* options, ConfigOptions::Action action) {
   command

@@ -5,6 +5,7 @@
 #include <cstdio>
 
 #include "host/base/ExitStatus.h"
+#include "host/commands/CommandFailure.h"
 #include "host/document/DescriptionBlock.h"
 #include "host/document/DescriptionDocument.h"
 #include "host/document/DescriptionForm.h"
@@ -17,11 +18,6 @@
 #include "interfaces/IProtocol.h"
 
 namespace {
-
-int Fail(ExitStatus status, const std::string& text) {
-  TellUser(text);
-  return static_cast<int>(status);
-}
 
 // Asks the plug-in. The platform stays empty: the driver's interface does not tell it.
 HostResult LoadDescription(const std::string& pluginFile, DescriptionBlock* block) {

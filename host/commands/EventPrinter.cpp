@@ -43,7 +43,7 @@ std::string Coloured(const HostEvent& event, const TextStyle& style) {
   return isHostMessage ? style.Bold(text) : text;
 }
 
-std::string Join(const std::vector<std::string>& lines) {
+std::string JoinLines(const std::vector<std::string>& lines) {
   std::string text;
   for (const std::string& line : lines) {
     text += (text.empty() ? "" : "; ") + line;
@@ -118,7 +118,7 @@ void EventPrinter::PrintToken(const HostEvent& event, const TokenReceived& token
       break;
   }
   if (token.isCut && !options_.isQuiet) {
-    TellUser(Join(HintsForCutToken(token.bytes.size(), token.lengthBytes)));
+    TellUser(JoinLines(HintsForCutToken(token.bytes.size(), token.lengthBytes)));
   }
 }
 

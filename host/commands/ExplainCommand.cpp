@@ -5,6 +5,7 @@
 #include <cstdio>
 
 #include "host/base/ExitStatus.h"
+#include "host/commands/CommandFailure.h"
 #include "host/commands/InstanceAccess.h"
 #include "host/framing/ConfigEdit.h"
 #include "host/framing/ConfigReport.h"
@@ -15,11 +16,6 @@
 #include "host/text/Output.h"
 
 namespace {
-
-int Fail(ExitStatus status, const std::string& text) {
-  TellUser(text);
-  return static_cast<int>(status);
-}
 
 // The line is silent behind the end of the input. Silences that follow each other add up.
 void Play(const LineScript& script, int gapMs, ByteLabeller* labeller) {

@@ -55,7 +55,7 @@ bool HasWantedPort(const PortMap& ports, const AttachedInstance& instance) {
   return !wanted.empty() && (wanted == path || std::filesystem::equivalent(wanted, path, error));
 }
 
-std::string Join(const std::vector<std::string>& words) {
+std::string JoinNames(const std::vector<std::string>& words) {
   std::string text;
   for (const std::string& word : words) {
     text += (text.empty() ? "" : ", ") + word;
@@ -71,7 +71,7 @@ Answer NoInstance(const InstanceAccess& access) {
     text += " on this port";
   }
   Answer answer = Refusal(text, ExitStatus::kPort);
-  const std::string running = Join(ControlNames());
+  const std::string running = JoinNames(ControlNames());
   answer.hints.emplace_back(running.empty() ? "loka run starts one" : "running: " + running);
   return answer;
 }
@@ -168,7 +168,7 @@ std::unique_ptr<Instance> AttachInstance(const InstanceAccess& access, Answer* a
   }
   if (found.size() > 1) {
     *answer = Refusal(
-        "several instances are running: " + Join(foundNames) + "; say which with --instance",
+        "several instances are running: " + JoinNames(foundNames) + "; say which with --instance",
         ExitStatus::kUsage);
     return nullptr;
   }

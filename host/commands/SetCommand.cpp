@@ -103,7 +103,7 @@ Answer Show(Instance* instance, const SetOptions& options) {
   return answer;
 }
 
-int Usage(const std::string& text) {
+int SetUsage(const std::string& text) {
   TellUser(PrintableUtf8(text));
   return static_cast<int>(ExitStatus::kUsage);
 }
@@ -127,7 +127,7 @@ int RunSet(SetOptions* options) {
   std::vector<SettingWord> settings;
   std::string error;
   if (!ParseWords(options->words, &settings, &error)) {
-    return Usage(error);
+    return SetUsage(error);
   }
   options->access.acknowledges = false;
   options->access.connects = false;

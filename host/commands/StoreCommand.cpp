@@ -43,7 +43,7 @@ int Tell(const Failure& failure) {
 }
 
 int Refuse(const std::string& text) { return Tell({ExitStatus::kRefused, text}); }
-int Usage(const std::string& text) { return Tell({ExitStatus::kUsage, text}); }
+int StoreUsage(const std::string& text) { return Tell({ExitStatus::kUsage, text}); }
 
 int Finish(const std::string& result) {
   const bool isWritten = result.empty() || WriteResult(result);
@@ -310,10 +310,10 @@ int Set(const StoreOptions& options, Store* store, const std::string& ident) {
     SettingWord setting;
     std::string error;
     if (!ParseSettingWord(word, &setting, &error)) {
-      return Usage(error);
+      return StoreUsage(error);
     }
     if (!values.emplace(StoredKey(ident, setting.entry->key), StoredValueOf(setting)).second) {
-      return Usage(std::string(setting.entry->key) + " is given twice");
+      return StoreUsage(std::string(setting.entry->key) + " is given twice");
     }
   }
   return Write(store, values);
@@ -352,13 +352,14 @@ int Import(const StoreOptions& options, Store* store) {
   std::string error;
   Values values;
   if (!ReadImport(options.importFile, &text, &error) || !ParseStoreJson(text, &values, &error)) {
-    return Usage(error + "; nothing is stored");
+    return StoreUsage(error + "; nothing is stored");
   }
   if (!options.ident.empty()) {
     Values renamed;
     for (auto& [key, value] : values) {
       if (!renamed.emplace(StoredKey(options.ident, key.second), value).second) {
-        return Usage("several key spaces hold " + key.second + ", so --ident cannot take them all");
+        return StoreUsage("several key spaces hold " + key.second +
+                          ", so --ident cannot take them all");
       }
     }
     values = std::move(renamed);
@@ -414,7 +415,7 @@ void AddStore(CLI::App* app, StoreOptions* options) {
 
 int RunStore(const StoreOptions& options) {
   if (options.action == Action::kRemove && options.words.empty() && !options.isAll) {
-    return Usage("say which settings, or --all");
+    return StoreUsage("say which settings, or --all");
   }
   Store store(options);
   Failure failure;

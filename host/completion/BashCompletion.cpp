@@ -90,7 +90,7 @@ std::string Tables(const CommandModel& root) {
          Table("_loka_values", values);
 }
 
-constexpr const char* kHead = R"(# SPDX-License-Identifier: Apache-2.0
+constexpr const char* kBashHead = R"(# SPDX-License-Identifier: Apache-2.0
 # Completion for loka in bash, written by "loka completion bash".
 
 )";
@@ -187,4 +187,6 @@ complete -F _loka loka
 
 }  // namespace
 
-std::string BashCompletion(const CommandModel& root) { return kHead + Tables(root) + kFunctions; }
+std::string BashCompletion(const CommandModel& root) {
+  return kBashHead + Tables(root) + kFunctions;
+}

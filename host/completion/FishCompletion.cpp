@@ -5,7 +5,7 @@
 
 namespace {
 
-constexpr const char* kHead = R"fish(# SPDX-License-Identifier: Apache-2.0
+constexpr const char* kFishHead = R"fish(# SPDX-License-Identifier: Apache-2.0
 # Completion for loka in fish, written by "loka completion fish".
 
 # __loka_ask KIND...: words that only this machine knows.
@@ -29,7 +29,7 @@ end
 
 )fish";
 
-std::string Quoted(const std::string& text) {
+std::string FishQuoted(const std::string& text) {
   std::string quoted = "'";
   for (const char c : text) {
     if (c == '\'' || c == '\\') {
@@ -62,7 +62,7 @@ bool AreFiles(const ValueWords& values) {
 std::string Value(const ValueWords& values) {
   const std::string words = Words(values);
   return std::string(AreFiles(values) ? " -r -F" : " -x") +
-         (words.empty() ? "" : " -a " + Quoted(words));
+         (words.empty() ? "" : " -a " + FishQuoted(words));
 }
 
 std::string OptionLine(const std::string& begin, const OptionModel& option) {
@@ -74,22 +74,22 @@ std::string OptionLine(const std::string& begin, const OptionModel& option) {
   if (option.TakesValue()) {
     line += Value(option.values);
   }
-  return line + " -d " + Quoted(option.help) + "\n";
+  return line + " -d " + FishQuoted(option.help) + "\n";
 }
 
 std::string LinesOf(const PlacedCommand& placed) {
   const CommandModel& command = *placed.command;
-  const std::string begin = "complete -c loka -n " + Quoted("__loka_at '" + placed.path + "'");
+  const std::string begin = "complete -c loka -n " + FishQuoted("__loka_at '" + placed.path + "'");
   std::string lines;
   for (const CommandModel& below : command.commands) {
-    lines += begin + " -a " + below.name + " -d " + Quoted(below.summary) + "\n";
+    lines += begin + " -a " + below.name + " -d " + FishQuoted(below.summary) + "\n";
   }
   for (const OptionModel& option : command.options) {
     lines += OptionLine(begin, option);
   }
   for (const PositionalModel& positional : command.positionals) {
     const std::string words = Words(positional.values);
-    lines += words.empty() ? "" : begin + " -a " + Quoted(words) + "\n";
+    lines += words.empty() ? "" : begin + " -a " + FishQuoted(words) + "\n";
     lines += AreFiles(positional.values) ? begin + " -F\n" : "";
   }
   return lines;
@@ -104,5 +104,5 @@ std::string FishCompletion(const CommandModel& root) {
     paths += placed.path.empty() ? "" : " " + placed.path;
     lines += LinesOf(placed);
   }
-  return kHead + ("set -g __loka_paths" + paths + "\n\ncomplete -c loka -f\n") + lines;
+  return kFishHead + ("set -g __loka_paths" + paths + "\n\ncomplete -c loka -f\n") + lines;
 }

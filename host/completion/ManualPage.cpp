@@ -223,7 +223,7 @@ std::string ConfigurationKeys() {
   return text;
 }
 
-std::string Settings() {
+std::string SettingEntries() {
   std::string text = Head({"Setting", "Key", "Tag"});
   for (const SettingEntry& setting : kSettingTable) {
     text += Row({Plain(setting.key), Plain(setting.configKey), Plain(TagUri(setting))});
@@ -243,7 +243,7 @@ bool FillManualPage(const std::string& page, const CommandModel& root, std::stri
       {"@events@", EventEntries},
       {"@port-options@", PortOptionEntries},
       {"@configuration-keys@", ConfigurationKeys},
-      {"@settings@", Settings}};
+      {"@settings@", SettingEntries}};
   std::string text;
   std::istringstream lines(page);
   for (std::string line; std::getline(lines, line);) {

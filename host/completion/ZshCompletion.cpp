@@ -8,7 +8,7 @@
 
 namespace {
 
-constexpr const char* kHead = R"zsh(#compdef loka
+constexpr const char* kZshHead = R"zsh(#compdef loka
 # SPDX-License-Identifier: Apache-2.0
 # Completion for loka in zsh, written by "loka completion zsh".
 
@@ -52,7 +52,9 @@ std::string Replaced(std::string text, const std::string& from, const std::strin
 }
 
 // A text inside single quotes.
-std::string Quoted(const std::string& text) { return "'" + Replaced(text, "'", R"('\'')") + "'"; }
+std::string ZshQuoted(const std::string& text) {
+  return "'" + Replaced(text, "'", R"('\'')") + "'";
+}
 
 // A help text inside the brackets of a specification, or behind the colon of a list.
 std::string Help(const std::string& text) {
@@ -103,14 +105,14 @@ std::string OptionLines(const OptionModel& option) {
   for (const std::string& name : option.names) {
     std::string argument = before;
     argument.append(Named(name, option.TakesValue())).append(behind);
-    lines.append(" \\\n    ").append(Quoted(argument));
+    lines.append(" \\\n    ").append(ZshQuoted(argument));
   }
   return lines;
 }
 
 std::string PositionalLine(const PositionalModel& positional, const std::string& action) {
   const std::string place = positional.isRepeated ? "*:" : positional.isRequired ? ":" : "::";
-  return " \\\n    " + Quoted(place + Help(positional.name) + ":" + action);
+  return " \\\n    " + ZshQuoted(place + Help(positional.name) + ":" + action);
 }
 
 std::string FunctionName(const std::string& path) {
@@ -152,7 +154,7 @@ std::string FunctionOf(const std::string& path, const CommandModel& command) {
   std::string list;
   std::string cases;
   for (const CommandModel& below : command.commands) {
-    list += "\n        " + Quoted(Help(below.name) + ":" + below.summary);
+    list += "\n        " + ZshQuoted(Help(below.name) + ":" + below.summary);
     cases += "\n        " + below.name + ") " + FunctionName(path + "/" + below.name) + " ;;";
   }
   return text + "  local context state line\n  typeset -A opt_args\n  _arguments -C" + options +
@@ -165,7 +167,7 @@ std::string FunctionOf(const std::string& path, const CommandModel& command) {
 }  // namespace
 
 std::string ZshCompletion(const CommandModel& root) {
-  std::string text = kHead;
+  std::string text = kZshHead;
   for (const PlacedCommand& placed : AllCommands(root)) {
     text += FunctionOf(placed.path, *placed.command);
   }

@@ -10,12 +10,12 @@
 
 #include "host/base/Deadline.h"
 #include "host/base/ExitStatus.h"
+#include "host/demo/DemoLimit.h"
 #include "host/port/PseudoTerminal.h"
 #include "host/text/ByteText.h"
 
 namespace {
 
-constexpr int kLimitMs = 20000;
 constexpr std::size_t kChunkBytes = 1024;
 
 void PrintLine(const std::string& line) {
@@ -35,7 +35,7 @@ void Obey(const PseudoTerminal& line, const std::string& command) {
   constexpr const char* kSend = "send ";
   std::string bytes;
   if (command.rfind(kSend, 0) == 0 && ParseHexBytes(command.substr(5), &bytes) &&
-      line.Send(bytes, Deadline::After(kLimitMs))) {
+      line.Send(bytes, Deadline::After(kDemoLimitMs))) {
     PrintLine("sent " + HexBytes(bytes));
   } else {
     PrintLine("failed " + command);
@@ -61,7 +61,7 @@ bool ObeyInput(const PseudoTerminal& line, std::string* pending) {
 
 DemoDevice::DemoDevice() : process_("/proc/self/exe", {"loka", "demo-device"}) {
   std::string kind;
-  if (!ReadReport(Deadline::After(kLimitMs), &kind, &portPath_) || kind != "port") {
+  if (!ReadReport(Deadline::After(kDemoLimitMs), &kind, &portPath_) || kind != "port") {
     throw std::runtime_error("the simulated device does not start");
   }
 }
@@ -81,7 +81,7 @@ bool DemoDevice::Send(const std::string& bytes) {
   if (!process_.WriteLine("send " + HexBytes(bytes))) {
     return false;
   }
-  const Deadline deadline = Deadline::After(kLimitMs);
+  const Deadline deadline = Deadline::After(kDemoLimitMs);
   std::string kind;
   std::string value;
   while (ReadReport(deadline, &kind, &value)) {
@@ -116,7 +116,7 @@ int RunDemoDevice() {
   std::string pending;
   for (;;) {
     std::array<pollfd, 2> waits = {{{STDIN_FILENO, POLLIN, 0}, {line.FileDescriptor(), POLLIN, 0}}};
-    if (Deadline::After(kLimitMs).Poll(waits.data(), waits.size()) < 0) {
+    if (Deadline::After(kDemoLimitMs).Poll(waits.data(), waits.size()) < 0) {
       return static_cast<int>(ExitStatus::kRefused);
     }
     if (waits[1].revents != 0) {

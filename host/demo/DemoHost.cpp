@@ -2,10 +2,10 @@
 #include "host/demo/DemoHost.h"
 
 #include "host/base/Deadline.h"
+#include "host/demo/DemoLimit.h"
 
 namespace {
 
-constexpr int kLimitMs = 20000;
 // Long enough for every text of the demonstration.
 constexpr const char* kTextType = "string-64";
 
@@ -46,17 +46,17 @@ DemoHost::DemoHost(const DemoHostOptions& options)
 
 bool DemoHost::WaitForTokens(unsigned int count) {
   return events_.WaitUntil([&] { return Number("tokens_available", "unsignedInt") >= count; },
-                           Deadline::After(kLimitMs));
+                           Deadline::After(kDemoLimitMs));
 }
 
 bool DemoHost::WaitForBytes(std::uint64_t count) {
   return events_.WaitUntil([&] { return events_.Progress().receivedBytes >= count; },
-                           Deadline::After(kLimitMs));
+                           Deadline::After(kDemoLimitMs));
 }
 
 bool DemoHost::WaitForNewPass() {
   // The first silence may have ended already, in a pass that began with the former settings.
-  return events_.WaitForSilences(2, Deadline::After(kLimitMs));
+  return events_.WaitForSilences(2, Deadline::After(kDemoLimitMs));
 }
 
 std::unique_ptr<HostTag> DemoHost::MakeTag(const std::string& memoryType, const std::string& type) {

@@ -6,11 +6,11 @@
 
 #include "host/base/ChildProcess.h"
 #include "host/base/Deadline.h"
+#include "host/demo/DemoLimit.h"
 #include "host/text/ByteText.h"
 
 namespace {
 
-constexpr int kLimitMs = 20000;
 constexpr const char* kFramed = "rx_prefix=02 rx_suffix=03";
 
 std::string Quoted(const std::string& text) { return "\"" + EscapeBytes(text) + "\""; }
@@ -74,7 +74,7 @@ void DemoSteps::ExpectWaiting(unsigned int count) {
 
 void DemoSteps::ExpectToken(const std::string& token) {
   if (!host_->WaitForTokens(1)) {
-    report_->Fail("no token within " + std::to_string(kLimitMs) + " ms");
+    report_->Fail("no token within " + std::to_string(kDemoLimitMs) + " ms");
     return;
   }
   report_->Expect("rx_token_len", std::to_string(host_->Number("rx_token_len", "unsignedInt")),
@@ -159,7 +159,7 @@ void DemoSteps::SentToken() {
   const std::string expected =
       "\x02"
       "CD\r\n";
-  const std::string seen = device_->TakeSeen(expected.size(), Deadline::After(kLimitMs));
+  const std::string seen = device_->TakeSeen(expected.size(), Deadline::After(kDemoLimitMs));
   for (std::size_t i = 0; i < seen.size() || i < expected.size(); ++i) {
     const std::string label = "device sees byte " + std::to_string(i + 1);
     report_->Expect(label, i < seen.size() ? HexBytes(seen.substr(i, 1)) : "nothing",
@@ -212,7 +212,7 @@ void DemoSteps::OverrideAfterRestart() {
                                             "--store", storeFile_, "--plugin", pluginFile_});
   report_->Show("host", "runs again as process " + std::to_string(restarted.ProcessId()));
   report_->Show("configuration", kFramed);
-  const Deadline deadline = Deadline::After(kLimitMs);
+  const Deadline deadline = Deadline::After(kDemoLimitMs);
   std::string line;
   (void)restarted.ReadLine(deadline, &line);
   report_->Expect("SP_RxSuffix", line, "suffix 3B");

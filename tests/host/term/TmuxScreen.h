@@ -1,6 +1,8 @@
 // SPDX-License-Identifier: Apache-2.0
 #pragma once
 
+#include <gtest/gtest.h>
+
 #include <cstdlib>
 #include <fstream>
 #include <iterator>
@@ -53,7 +55,7 @@ class TmuxScreen {
   void Signal(int signalNumber) const {
     const std::string shell = "$(tmux -S '" + folder_.File("tmux") + "' display -p '#{pane_pid}')";
     const std::string command = "pkill -" + std::to_string(signalNumber) + " -P " + shell;
-    (void)std::system(command.c_str());
+    EXPECT_EQ(std::system(command.c_str()), 0) << command;
   }
 
   // Everything on the screen and above it.
