@@ -8,6 +8,7 @@
 #include <fstream>
 
 #include "tests/plugin/PluginFixture.h"
+#include "tests/support/Sanitized.h"
 
 namespace {
 
@@ -331,15 +332,6 @@ TEST_F(PluginFixture, EveryHostCallMayFailOnce) {
     ASSERT_EQ(plugin_.Init(&host_), 1);
   }
 }
-
-#if defined(__has_feature)
-#if __has_feature(address_sanitizer) || __has_feature(thread_sanitizer)
-#define LOKA_SANITIZED
-#endif
-#endif
-#if defined(__SANITIZE_ADDRESS__) || defined(__SANITIZE_THREAD__)
-#define LOKA_SANITIZED
-#endif
 
 // The sanitizers reserve more address space than the limit leaves.
 #ifndef LOKA_SANITIZED

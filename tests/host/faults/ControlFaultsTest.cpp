@@ -14,6 +14,7 @@
 #include "host/port/PseudoTerminal.h"
 #include "tests/host/control/ControlFolder.h"
 #include "tests/host/faults/RunBench.h"
+#include "tests/support/Sanitized.h"
 
 namespace {
 
@@ -58,6 +59,9 @@ class NoDescriptors {
 };
 
 TEST(ControlFaults, WithoutDescriptorsTheServerWaitsInsteadOfSpinning) {
+#ifdef LOKA_SANITIZED
+  GTEST_SKIP() << "a sanitizer needs descriptors of its own to look at an object";
+#endif
   const ControlFolderForTest folder;
   std::string error;
   const auto server = ControlServer::Listen(
@@ -78,6 +82,9 @@ TEST(ControlFaults, WithoutDescriptorsTheServerWaitsInsteadOfSpinning) {
 
 // The same in the program: it says so, goes on, and lets the next client in later.
 TEST(ControlFaults, WithoutDescriptorsAnInstanceSaysSoAndGoesOn) {
+#ifdef LOKA_SANITIZED
+  GTEST_SKIP() << "a sanitizer needs descriptors of its own to look at an object";
+#endif
   constexpr int kClients = 30;  // more than there are descriptors, less than those and the backlog
   const RunBench bench;
   const PseudoTerminal line;

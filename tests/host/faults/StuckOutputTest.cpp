@@ -3,6 +3,7 @@
 // it within its limit, a second one at once, and a terminal gets its state back.
 #include <fcntl.h>
 #include <gtest/gtest.h>
+#include <sys/ioctl.h>
 #include <sys/stat.h>
 #include <termios.h>
 #include <unistd.h>
@@ -145,6 +146,19 @@ class StuckTerm : public testing::Test {
            now.c_lflag == before_.c_lflag && now.c_cflag == before_.c_cflag;
   }
 
+  // Full once it holds much and no more comes for a while.
+  bool AwaitFullTerminal(const Deadline& limit) const {
+    constexpr int kMuch = 2000;
+    constexpr int kQuietMs = 300;
+    int held = -1;
+    for (int before = -2; (held < kMuch || held != before) && !limit.HasPassed();) {
+      before = held;
+      Deadline::After(kQuietMs).Sleep();
+      (void)ioctl(terminal_, FIONREAD, &held);
+    }
+    return held >= kMuch;
+  }
+
   RunBench bench_;
   PseudoTerminal line_;
   int terminal_ = -1;
@@ -165,7 +179,7 @@ TEST_F(StuckTerm, ASecondSignalEndsItAtOnceAndPutsTheTerminalBack) {
   ASSERT_FALSE(IsPutBack()) << "the terminal was never changed";
   SendTokens(line_);
   // What the terminal still took was shown; from here on it writes to nobody.
-  Deadline::After(300).Sleep();
+  ASSERT_TRUE(AwaitFullTerminal(limit));
   const auto begin = std::chrono::steady_clock::now();
   term->Signal(SIGTERM);
   Deadline::After(300).Sleep();
