@@ -28,7 +28,7 @@ int ProtocolBase::Read(const ITag* tag, unsigned char* value) {
     return 0;
   }
   return Guarded(0, [&] {
-    constexpr std::size_t kStackBytes = 128;
+    constexpr std::size_t kStackBytes = 64;
     const int size = tag->PackedLen();
     WorkBuffer<kStackBytes> image(size);
     if (!image.IsValid()) {

@@ -209,13 +209,13 @@ TEST_F(ProtocolBaseConsoleTest, ReadOfAnyLength) {
 }
 
 TEST_F(ProtocolBaseConsoleTest, ReadWithoutMemoryForItsValueSaysSo) {
-  // The 129 bytes of the value do not fit on the stack; a refused allocation is an error like any.
+  // The 65 bytes of the value do not fit on the stack; a refused allocation is an error like any.
   for (int nth = 1;; ++nth) {
     GuardedBuffer reply(200);
     bool hasFailed = false;
     {
       const FailingNew noMemory(nth);
-      driver_.DoCommand("read binary-129", reply.Chars(), 200);
+      driver_.DoCommand("read binary-65", reply.Chars(), 200);
       hasFailed = noMemory.HasFailed();
     }
     EXPECT_TRUE(reply.AreGuardsIntact()) << nth;
