@@ -11,7 +11,8 @@
 // A host semaphore that serves strictly first come, first served: a ticket lock whose waiters sleep
 // in the kernel (futex(2)). The receive task takes its semaphore again right after letting it go; a
 // lock without an order could make everybody else wait for good. Without contention neither
-// operation makes a system call. Not recursive.
+// operation makes a system call, and whoever is next looks for some microseconds whether its turn
+// comes before it goes to sleep. Not recursive.
 //
 // The favourite. A thread that has taken the semaphore many times with nobody in between becomes
 // its favourite and draws no more numbers: it says that it holds the semaphore and looks whether
