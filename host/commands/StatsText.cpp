@@ -22,6 +22,9 @@ std::string StatsText(const nlohmann::json& data) {
   }
   std::string text = "tokens " + CountText(data, "tokens");
   text += "  dropped " + std::to_string(dropCount) + (drops.empty() ? "" : " (" + drops + ")");
+  if (data.value("missed_bytes", std::uint64_t{0}) > 0) {
+    text += "  missed bytes " + CountText(data, "missed_bytes");
+  }
   if (data.contains("line_errors")) {
     const nlohmann::json& errors = data["line_errors"];
     text += "  framing errors " + CountText(errors, "framing");

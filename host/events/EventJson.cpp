@@ -80,7 +80,12 @@ class DetailWriter {
     Set("text", detail.reply);
   }
 
-  void operator()(const NoteMade& detail) { Set("text", detail.text); }
+  void operator()(const NoteMade& detail) {
+    Set("text", detail.text);
+    if (detail.missedBytes > 0) {
+      Set("missed", detail.missedBytes);
+    }
+  }
 
   void operator()(const FindingMade& detail) {
     Set("text", detail.text);
@@ -165,7 +170,7 @@ HostEvent::Detail DetailOf(const std::string& kind, const nlohmann::json& json) 
     return FindingMade{text("text"), BytesOf(json, "driver"), BytesOf(json, "model")};
   }
   if (kind == "note") {
-    return NoteMade{text("text")};
+    return NoteMade{text("text"), json.value("missed", std::uint64_t{0})};
   }
   throw std::invalid_argument("no kind of event: " + kind);
 }

@@ -70,6 +70,7 @@ struct ConsoleReplied {
 // Something the user should know.
 struct NoteMade {
   std::string text;
+  std::uint64_t missedBytes = 0;  // that the driver had and nobody else: they came too fast
 };
 
 // The driver's token and the host's own reading of the same bytes differ.

@@ -33,7 +33,7 @@ struct Statistics::Counter {
   void operator()(const FindingMade& /*detail*/) const { ++counts->findings_; }
   void operator()(const SettingChanged& /*detail*/) const {}
   void operator()(const ConsoleReplied& /*detail*/) const {}
-  void operator()(const NoteMade& /*detail*/) const {}
+  void operator()(const NoteMade& detail) const { counts->missedBytes_ += detail.missedBytes; }
 };
 
 void Statistics::OnEvent(const HostEvent& event) {
@@ -54,6 +54,7 @@ nlohmann::json Statistics::ToJson() const {
           {"tokens", tokens_},
           {"token_bytes", tokenBytes_},
           {"received_bytes", receivedBytes_},
+          {"missed_bytes", missedBytes_},
           {"sent_bytes", sentBytes_},
           {"sends", sends_},
           {"lost_sends", lostSends_},

@@ -14,8 +14,9 @@ class Statistics final : public EventSink {
  public:
   void OnEvent(const HostEvent& event) override;
 
-  // Keys: since (UTC), tokens, token_bytes, received_bytes, sent_bytes, sends, lost_sends, drops
-  // (by reason), dropped_bytes, losses, reconnects, findings.
+  // Keys: since (UTC), tokens, token_bytes, received_bytes, missed_bytes (too fast to be among the
+  // received ones), sent_bytes, sends, lost_sends, drops (by reason), dropped_bytes, losses,
+  // reconnects, findings.
   nlohmann::json ToJson() const;
 
  private:
@@ -26,6 +27,7 @@ class Statistics final : public EventSink {
   std::uint64_t tokens_ = 0;
   std::uint64_t tokenBytes_ = 0;
   std::uint64_t receivedBytes_ = 0;
+  std::uint64_t missedBytes_ = 0;
   std::uint64_t sentBytes_ = 0;
   std::uint64_t sends_ = 0;
   std::uint64_t lostSends_ = 0;

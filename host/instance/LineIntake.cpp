@@ -163,7 +163,7 @@ std::vector<LineRecord> LineIntake::Take(const Deadline& deadline) {
     record.kind = LineRecord::Kind::kMissed;
     record.timeUs = WallClockUs();
     record.text = std::to_string(missedBytes_) + " bytes came too fast to be shown one by one";
-    missedBytes_ = 0;
+    record.missedBytes = std::exchange(missedBytes_, 0);
     taken.push_back(std::move(record));
   }
   return taken;

@@ -21,11 +21,12 @@ struct LineRecord {
   std::int64_t timeUs = 0;          // time of day at which it happened, microseconds since 1970
   std::int64_t firstArrivalNs = 0;  // kServed: of the first and the last byte, CLOCK_MONOTONIC
   std::int64_t lastArrivalNs = 0;
-  std::string bytes;           // kServed, kSent
-  std::size_t takenBytes = 0;  // kSent: how many the line took
-  int silenceMs = 0;           // kSilence
-  int errorNumber = 0;         // kLost
-  std::string text;            // kLost, kNote, kMissed: bytes that were not kept
+  std::string bytes;              // kServed, kSent
+  std::size_t takenBytes = 0;     // kSent: how many the line took
+  int silenceMs = 0;              // kSilence
+  int errorNumber = 0;            // kLost
+  std::uint64_t missedBytes = 0;  // kMissed: how many were not kept
+  std::string text;               // kLost, kNote, kMissed
 };
 
 // Keeps what the port tells until the thread that serves the instance takes it. Any thread.

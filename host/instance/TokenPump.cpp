@@ -113,7 +113,7 @@ void TokenPump::Follow(const LineRecord& record) {
       // The driver has had them: its tokens are no longer those of the bytes that are known.
       check_.Interrupt();
       lineTokens_.clear();
-      events_->Publish(NoteMade{record.text}, record.timeUs);
+      events_->Publish(NoteMade{record.text, record.missedBytes}, record.timeUs);
       break;
     case LineRecord::Kind::kNote:
       events_->Publish(NoteMade{record.text}, record.timeUs);

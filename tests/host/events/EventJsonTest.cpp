@@ -50,6 +50,8 @@ std::vector<Case> Cases() {
       {"Console", EventAtTime(ConsoleReplied{"get_stat", true, "Connected"}),
        R"("ev":"console","port":"com1","command":"get_stat","ok":true,"text":"Connected"})"},
       {"Note", EventAtTime(NoteMade{"note"}), R"("ev":"note","port":"com1","text":"note"})"},
+      {"Missed", EventAtTime(NoteMade{"note", 3}),
+       R"("ev":"note","port":"com1","text":"note","missed":3})"},
       {"Finding", EventAtTime(FindingMade{"differs", "A", "B"}),
        R"("ev":"finding","port":"com1","text":"differs","driver":"41","model":"42"})"},
   };

@@ -98,10 +98,12 @@ TEST(StatisticsTest, CountsWhatHappened) {
   stream.Publish(PortChanged{"lost", "EIO", ""});
   stream.Publish(PortChanged{"back", "", ""});
   stream.Publish(FindingMade{});
+  stream.Publish(NoteMade{"some came too fast", 7});
   stream.Remove(&statistics);
   stream.Publish(BytesReceived{"not counted any more"});
   const nlohmann::json counts = statistics.ToJson();
   EXPECT_EQ(counts["received_bytes"], 5);
+  EXPECT_EQ(counts["missed_bytes"], 7);
   EXPECT_EQ(counts["tokens"], 1);
   EXPECT_EQ(counts["token_bytes"], 3);
   EXPECT_EQ(counts["drops"], nlohmann::json({{"no-suffix", 2}, {"over-1000", 1}}));

@@ -55,34 +55,61 @@ class EndlessDevice {
   std::thread thread_;
 };
 
+// What the first `count` tokens are on the line.
+std::uint64_t BytesOfTokens(std::uint64_t count) {
+  std::uint64_t bytes = 0;
+  for (std::uint64_t number = 1; number <= count; ++number) {
+    bytes += std::to_string(number).size() + 2;
+  }
+  return bytes;
+}
+
+constexpr std::uint64_t kLeastFrameBytes = 3;
+
 TEST(Flood, ADeviceThatNeverPausesIsReadAndCommandsAreAnsweredMeanwhile) {
+  constexpr int kAnswers = 10;
+  constexpr std::uint64_t kTokens = 1000;
   const RunBench bench;
   const PseudoTerminal line;
   const auto run = bench.BeginReady(line.Path(), "rx_prefix=02 rx_suffix=03 token_queue_size=100");
   EndlessDevice device(&line);
   ControlClient client(bench.SocketFile());
-  const Deadline end = Deadline::After(700);
+  const Deadline atLeast = Deadline::After(700);
+  const Deadline limit = Deadline::After(ProgramRun::kLimitMs);
   int answers = 0;
-  while (!end.HasPassed()) {
+  while (!atLeast.HasPassed() ||
+         ((answers < kAnswers || device.Sent() < kTokens) && !limit.HasPassed())) {
     const Json answer = client.Ask(R"({"op":"read","uri":"0?tokens_available?unsignedInt"})");
     ASSERT_TRUE(answer.value("ok", false)) << answer.dump();
     ++answers;
     Deadline::After(20).Sleep();
   }
-  EXPECT_GT(answers, 5);
+  EXPECT_GE(answers, kAnswers);
   const std::uint64_t sent = device.Stop();
-  EXPECT_GT(sent, 1000U);
-  const Deadline limit = Deadline::After(ProgramRun::kLimitMs);
+  EXPECT_GE(sent, kTokens);
+  const std::uint64_t sentBytes = BytesOfTokens(sent);
+  ASSERT_TRUE(bench.AwaitCount("received_bytes", sentBytes - bench.Count("missed_bytes")));
+  const std::uint64_t missedBytes = bench.Count("missed_bytes");
+  // What a slow machine was told as missed may hold so many tokens, and cuts one at each end.
+  const std::uint64_t missed = missedBytes == 0 ? 0 : missedBytes / kLeastFrameBytes + 2;
+  const Deadline end = Deadline::After(ProgramRun::kLimitMs);
   std::uint64_t shown = 0;
   std::uint64_t dropped = 0;
-  while (shown + dropped < sent && !limit.HasPassed()) {
+  while (shown + dropped + missed < sent && !end.HasPassed()) {
     Deadline::After(20).Sleep();
     shown = bench.Count("tokens");
     dropped = bench.Count("drops/queue-full");
   }
-  EXPECT_EQ(shown + dropped, sent) << shown << " shown, " << dropped << " dropped";
+  std::printf("%llu sent, %llu shown, %llu dropped and told, %llu bytes told as missed\n",
+              static_cast<unsigned long long>(sent), static_cast<unsigned long long>(shown),
+              static_cast<unsigned long long>(dropped),
+              static_cast<unsigned long long>(missedBytes));
+  EXPECT_LE(shown + dropped, sent);
+  EXPECT_GE(shown + dropped + missed, sent);
   EXPECT_EQ(bench.Count("findings"), 0U);
-  EXPECT_EQ(bench.Count("drops/no-prefix"), 0U);
+  if (missedBytes == 0) {
+    EXPECT_EQ(bench.Count("drops/no-prefix"), 0U);
+  }
   EXPECT_LT(MemoryKibOf(run->ProcessId(), "VmHWM"), kMemoryLimitKib);
 }
 
@@ -120,10 +147,7 @@ TEST(Flood, APipeThatIsNotReadLosesNothingUnseen) {
   std::uint64_t last = 0;
   std::uint64_t accountedBytes = 0;
   std::uint64_t missedBytes = 0;
-  std::uint64_t sentBytes = 0;
-  for (std::uint64_t number = 1; number <= sent; ++number) {
-    sentBytes += std::to_string(number).size() + 2;
-  }
+  const std::uint64_t sentBytes = BytesOfTokens(sent);
   // The tokens that waited at the end can be among the missed bytes as well, and so can the frame
   // that was cut off by them.
   constexpr std::uint64_t kBothBytes = 60 * 10;
@@ -142,9 +166,8 @@ TEST(Flood, APipeThatIsNotReadLosesNothingUnseen) {
     } else if (kind == "drop" && event.value("why", "") == "queue-full") {
       ++dropped;
       accountedBytes += event.value("hex", "").size() / 2 + 2;
-    } else if (kind == "note" &&
-               event.value("text", "").find("came too fast") != std::string::npos) {
-      missedBytes += std::stoull(event.value("text", ""));
+    } else if (kind == "note") {
+      missedBytes += event.value("missed", std::uint64_t{0});
     }
   }
   EXPECT_GE(accountedBytes + missedBytes + kBothBytes, sentBytes);

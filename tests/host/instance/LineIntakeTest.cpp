@@ -59,6 +59,7 @@ TEST(LineIntake, CountsWhatItCannotKeep) {
   const std::vector<LineRecord> records = TakeNow(&intake);
   ASSERT_EQ(records.size(), 9U);
   EXPECT_EQ(records.back().kind, LineRecord::Kind::kMissed);
+  EXPECT_EQ(records.back().missedBytes, 2097152U);
   EXPECT_EQ(records.back().text, "2097152 bytes came too fast to be shown one by one");
   intake.OnServed(megabyte, 1, 1);
   EXPECT_EQ(TakeNow(&intake).size(), 1U);

@@ -17,6 +17,26 @@ void AwaitUsers(const PosixSemaphore& semaphore, unsigned int count) {
   }
 }
 
+// A thread takes the semaphore ('a'), lets it go while another one waits ('w') and takes it again
+// at once. Returns who had it when.
+std::string TurnsBesideAWaiter(PosixSemaphore& semaphore) {
+  std::string order;  // guarded by the semaphore
+  semaphore.Lock();
+  std::thread waiting([&] {
+    semaphore.Lock();
+    order.push_back('w');
+    semaphore.Unlock();
+  });
+  AwaitUsers(semaphore, 2);
+  order.push_back('a');
+  semaphore.Unlock();
+  semaphore.Lock();
+  order.push_back('a');
+  semaphore.Unlock();
+  waiting.join();
+  return order;
+}
+
 TEST(PosixSemaphore, IsFreeAtFirstAndTakenOnce) {
   PosixSemaphore semaphore;
   EXPECT_EQ(semaphore.UserCount(), 0U);
@@ -81,23 +101,8 @@ TEST(PosixSemaphore, ServesInOrderOfArrival) {
 TEST(PosixSemaphore, ThreadThatLocksAgainAtOnceStandsBehindTheOneThatWaits) {
   constexpr int kRounds = 200;
   PosixSemaphore semaphore;
-  std::vector<char> order;  // guarded by the semaphore
   for (int round = 0; round < kRounds; ++round) {
-    order.clear();
-    semaphore.Lock();
-    std::thread waiting([&] {
-      semaphore.Lock();
-      order.push_back('w');
-      semaphore.Unlock();
-    });
-    AwaitUsers(semaphore, 2);
-    order.push_back('a');
-    semaphore.Unlock();
-    semaphore.Lock();
-    order.push_back('a');
-    semaphore.Unlock();
-    waiting.join();
-    ASSERT_EQ(std::string(order.begin(), order.end()), "awa");
+    ASSERT_EQ(TurnsBesideAWaiter(semaphore), "awa");
   }
 }
 
@@ -148,29 +153,14 @@ TEST(PosixSemaphore, FavouriteTakesAndFreesLikeEverybody) {
 
 TEST(PosixSemaphore, FavouriteStandsBehindTheOneThatWaits) {
   PosixSemaphore semaphore;
-  std::vector<char> order;  // guarded by the semaphore
   for (int round = 0; round < 10; ++round) {
-    order.clear();
     // Each time that the favour ends it is harder to get.
     for (std::uint32_t i = 0;
          i < PosixSemaphore::kTurnsToFavour << 11U && !semaphore.HasFavourite(); ++i) {
       semaphore.Lock();
       semaphore.Unlock();
     }
-    semaphore.Lock();
-    std::thread waiting([&] {
-      semaphore.Lock();
-      order.push_back('w');
-      semaphore.Unlock();
-    });
-    AwaitUsers(semaphore, 2);
-    order.push_back('a');
-    semaphore.Unlock();
-    semaphore.Lock();
-    order.push_back('a');
-    semaphore.Unlock();
-    waiting.join();
-    ASSERT_EQ(std::string(order.begin(), order.end()), "awa");
+    ASSERT_EQ(TurnsBesideAWaiter(semaphore), "awa");
     EXPECT_FALSE(semaphore.HasFavourite());
   }
 }
