@@ -2,8 +2,9 @@
 # SPDX-License-Identifier: Apache-2.0
 # Fuzzes the driver with the address and undefined behaviour sanitizers: scripts/fuzz.sh [SECONDS]
 # [TARGET...]. Without arguments 60 seconds a target and all targets, as many at a time as there are
-# processors. An input that breaks something stands in fuzz/corpus/TARGET afterwards, where the ordinary tests replay it.
-# What a run learns is kept in the build folder (LOKA_FUZZ_DIR, build/fuzz otherwise) for the next run.
+# processors (LOKA_FUZZ_JOBS says otherwise). An input that breaks something stands in
+# fuzz/corpus/TARGET afterwards, where the ordinary tests replay it. What a run learns is kept in the
+# build folder (LOKA_FUZZ_DIR, build/fuzz otherwise) for the next run.
 
 . "$(dirname "$0")/lib.sh"
 
@@ -14,6 +15,7 @@ targets=("$@")
 [ ${#targets[@]} -gt 0 ] ||
   targets=(config tag_uri console receive conversion storage operations)
 build_dir=${LOKA_FUZZ_DIR:-$project_dir/build/fuzz}
+jobs=${LOKA_FUZZ_JOBS:-$(nproc)}
 
 need_packages "${build_packages[@]}" "${test_packages[@]}" "${check_packages[@]}"
 cd "$project_dir"
@@ -43,7 +45,7 @@ fuzz() {
 failed=0
 running=0
 for target in "${targets[@]}"; do
-  if [ "$running" -ge "$(nproc)" ]; then
+  if [ "$running" -ge "$jobs" ]; then
     wait -n || failed=$((failed + 1))
     running=$((running - 1))
   fi

@@ -9,7 +9,7 @@ project_dir=$(cd "$(dirname "${BASH_SOURCE[0]}")/.." && pwd)
 build_packages=(g++ cmake ninja-build pkg-config zlib1g-dev libsqlite3-dev libcli11-dev
   nlohmann-json3-dev libpugixml-dev libedit-dev libspdlog-dev scdoc)
 test_packages=(libgtest-dev binutils procps tmux zsh fish python3-jsonschema)
-check_packages=(clang clang-format clang-tidy libclang-rt-14-dev)
+check_packages=(clang clang-format clang-tidy libclang-rt-14-dev lld)
 
 say() { printf '\n== %s\n' "$*"; }
 
