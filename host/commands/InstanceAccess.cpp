@@ -178,6 +178,12 @@ std::unique_ptr<Instance> AttachInstance(const InstanceAccess& access, Answer* a
     }
     return nullptr;
   }
+  if (access.watches) {
+    *answer = found.front()->Subscribe();
+    if (!answer->IsDone()) {
+      return nullptr;
+    }
+  }
   TellAttached(access, *found.front());
   return std::move(found.front());
 }

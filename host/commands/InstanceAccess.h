@@ -32,6 +32,7 @@ struct InstanceAccess {
   bool isAttachWanted = false;
   bool isAttachRefused = false;
   bool acknowledges = true;
+  bool watches = false;  // events of an instance that runs already: all from "attached" on
   bool connects = true;
 };
 

@@ -82,6 +82,7 @@ int RunSub(SubOptions* options) {
     return static_cast<int>(ExitStatus::kRefused);
   }
   options->access.acknowledges = !options->isPeek;
+  options->access.watches = true;
   Answer answer;
   const auto instance = OpenInstance(&options->access, &answer);
   if (instance == nullptr) {

@@ -69,6 +69,7 @@ void Share(LocalInstance* instance, const InstanceAccess& access) {
 // A running instance, else one of its own that others can attach to. `local` tells the two apart.
 std::unique_ptr<Instance> OpenForTerm(InstanceAccess* access, LocalInstance** local,
                                       Answer* answer) {
+  access->watches = true;
   auto instance = OpenInstance(access, answer);
   *local = dynamic_cast<LocalInstance*>(instance.get());
   if (*local != nullptr) {

@@ -11,6 +11,14 @@ void EventStream::Publish(HostEvent::Detail detail) { Publish(std::move(detail),
 void EventStream::Publish(HostEvent::Detail detail, std::int64_t timeUs) {
   const HostEvent event{timeUs, port_, std::move(detail)};
   const std::lock_guard<std::mutex> lock(mutex_);
+  const std::string clockChange = clockWatch_.Look();
+  if (!clockChange.empty()) {
+    HandOn({WallClockUs(), port_, NoteMade{clockChange}});
+  }
+  HandOn(event);
+}
+
+void EventStream::HandOn(const HostEvent& event) const {
   for (EventSink* const sink : sinks_) {
     sink->OnEvent(event);
   }

@@ -6,6 +6,7 @@
 #include <utility>
 #include <vector>
 
+#include "host/events/ClockWatch.h"
 #include "host/events/EventSink.h"
 
 // Hands each event of one port to everybody who listens. Events of several threads come one after
@@ -19,7 +20,8 @@ class EventStream {
   EventStream& operator=(const EventStream&) = delete;
 
   // Stamps the event and hands it on. The time is now, or `timeUs` when the event happened earlier.
-  // A sink must not publish.
+  // The first event behind a change of the machine's clock has a note about it in front. A sink
+  // must not publish.
   void Publish(HostEvent::Detail detail);
   void Publish(HostEvent::Detail detail, std::int64_t timeUs);
 
@@ -30,7 +32,10 @@ class EventStream {
   const std::string& Port() const { return port_; }
 
  private:
+  void HandOn(const HostEvent& event) const;
+
   const std::string port_;
   std::mutex mutex_;
+  ClockWatch clockWatch_;
   std::vector<EventSink*> sinks_;
 };

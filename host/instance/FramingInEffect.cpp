@@ -4,6 +4,8 @@
 #include <array>
 #include <cstdlib>
 
+#include "host/text/FirstWord.h"
+
 namespace {
 
 constexpr const char* kDone = "OK";
@@ -15,9 +17,6 @@ std::string Active(const SettingsBook& book, const char* key) {
 int ActiveNumber(const SettingsBook& book, const char* key) {
   return static_cast<int>(std::strtol(Active(book, key).c_str(), nullptr, 10));
 }
-
-// Up to the first blank, as the driver's console takes its words.
-std::string FirstWord(const std::string& text) { return text.substr(0, text.find(' ')); }
 
 }  // namespace
 

@@ -17,6 +17,7 @@
 #include "host/runtime/HostTag.h"
 #include "host/runtime/SessionConsole.h"
 #include "host/text/ByteText.h"
+#include "host/text/FirstWord.h"
 #include "interfaces/IProtocol.h"
 
 namespace {
@@ -87,8 +88,6 @@ std::string TextOf(const Json& request, const char* key) {
   const auto found = request.find(key);
   return found != request.end() && found->is_string() ? found->get<std::string>() : std::string();
 }
-
-std::string FirstWord(const std::string& line) { return line.substr(0, line.find(' ')); }
 
 // Names of the keys that a request must have as texts, and of those that must be hexadecimal.
 struct RequestKeys {
