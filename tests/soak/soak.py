@@ -25,7 +25,7 @@ import tty
 STX, ETX = b"\x02", b"\x03"
 GAP_MS = 250
 LIMIT_S = 20  # for anything that is waited for
-RSS_GROWTH_KIB = 2048
+RSS_GROWTH_KIB = 512
 MAX_FRAME = 1000
 
 

@@ -1,5 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
+#include <fcntl.h>
 #include <gtest/gtest.h>
+#include <termios.h>
 #include <unistd.h>
 
 #include <chrono>
@@ -45,6 +47,15 @@ std::unique_ptr<PosixSerialPort> OpenPort(const std::string& path, PortObserver*
   std::shared_ptr<SerialDevice> device = SerialDevice::Open(PortOptions::For(path), &problem);
   EXPECT_NE(device, nullptr) << problem.text;
   return std::make_unique<PosixSerialPort>(device, PortOptions::For(path), observer);
+}
+
+// What the system has set for a line.
+termios SettingsOf(const std::string& path) {
+  termios settings{};
+  const int descriptor = open(path.c_str(), O_RDWR | O_NOCTTY | O_CLOEXEC);
+  EXPECT_EQ(tcgetattr(descriptor, &settings), 0) << path;
+  (void)close(descriptor);
+  return settings;
 }
 
 // Processor time of a process in milliseconds.
@@ -94,6 +105,9 @@ TEST(HangUp, LineThatComesBackIsOpenedAgainWithItsSettings) {
   EXPECT_EQ(byte, 'z');
   ASSERT_EQ(observer.Notes().size(), 2U);
   EXPECT_EQ(observer.Notes()[1], "back " + line.Path());
+  const termios settings = SettingsOf(line.Path());
+  EXPECT_EQ(cfgetospeed(&settings), static_cast<speed_t>(B19200));
+  EXPECT_EQ(settings.c_lflag & (ICANON | ECHO), 0U);
   EXPECT_EQ(port->Send(&byte, 1, 0), 1);
   std::string seen;
   EXPECT_TRUE(line->Receive(1, Deadline::After(kLimitMs), &seen));
