@@ -31,7 +31,7 @@ cmake --build "$build_dir" --target bench_programs
 if [ ! -d "$node_dir/node_modules/serialport" ]; then
   say "Fetching node-serialport into $node_dir"
   mkdir -p "$node_dir"
-  (cd "$node_dir" && npm install --no-audit --no-fund --silent serialport)
+  (cd "$node_dir" && npm install --no-audit --no-fund --loglevel=error serialport)
 fi
 
 more=("$@")
