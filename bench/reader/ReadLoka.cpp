@@ -23,16 +23,19 @@ constexpr const char* kConfiguration =
 class Pauses final : public PortObserver {
  public:
   void OnReceivePause(const ReceiveProgress& progress) override {
-    const std::lock_guard<std::mutex> lock(mutex_);
-    if (progress.receivedBytes != seenBytes_) {
-      seenBytes_ = progress.receivedBytes;
-      pausesToTell_ = 2;
-    }
-    if (pausesToTell_ > 0) {
+    {
+      const std::lock_guard<std::mutex> lock(mutex_);
+      if (progress.receivedBytes != seenBytes_) {
+        seenBytes_ = progress.receivedBytes;
+        pausesToTell_ = 2;
+      }
+      if (pausesToTell_ == 0) {
+        return;
+      }
       --pausesToTell_;
       isNews_ = true;
-      changed_.notify_one();
     }
+    changed_.notify_one();
   }
   void OnLineLost(const std::string& /*path*/, const std::string& /*why*/,
                   int /*errorNumber*/) override {}

@@ -30,16 +30,19 @@ std::int64_t WallOf(std::int64_t monotonicNs) {
 }  // namespace
 
 void LineIntake::Add(LineRecord record) {
-  const std::lock_guard<std::mutex> lock(mutex_);
-  // Once bytes are missing, those behind them would be read as their continuation.
-  const bool isFull = missedBytes_ > 0 || keptBytes_ + record.bytes.size() > kMaxKeptBytes ||
-                      records_.size() >= kMaxKeptRecords;
-  if (isFull && !record.bytes.empty()) {
-    missedBytes_ += record.bytes.size();
-    return;
+  {
+    const std::lock_guard<std::mutex> lock(mutex_);
+    // Once bytes are missing, those behind them would be read as their continuation.
+    const bool isFull = missedBytes_ > 0 || keptBytes_ + record.bytes.size() > kMaxKeptBytes ||
+                        records_.size() >= kMaxKeptRecords;
+    if (isFull && !record.bytes.empty()) {
+      missedBytes_ += record.bytes.size();
+      return;
+    }
+    keptBytes_ += record.bytes.size();
+    records_.push_back(std::move(record));
   }
-  keptBytes_ += record.bytes.size();
-  records_.push_back(std::move(record));
+  // With the mutex free: the serving thread would wake up only to wait for it.
   changed_.notify_all();
 }
 
@@ -57,16 +60,19 @@ void LineIntake::OnServed(std::string_view bytes, std::int64_t firstArrivalNs,
 // The driver has used up what came. It may queue a token now, or once a silence has ended it; the
 // serving thread looks both times. Later silences of a quiet line wake nobody.
 void LineIntake::OnReceivePause(const ReceiveProgress& progress) {
-  const std::lock_guard<std::mutex> lock(mutex_);
-  if (progress.receivedBytes != seenBytes_) {
-    seenBytes_ = progress.receivedBytes;
-    pausesToTell_ = 2;
-  }
-  if (pausesToTell_ > 0) {
+  {
+    const std::lock_guard<std::mutex> lock(mutex_);
+    if (progress.receivedBytes != seenBytes_) {
+      seenBytes_ = progress.receivedBytes;
+      pausesToTell_ = 2;
+    }
+    if (pausesToTell_ == 0) {
+      return;
+    }
     --pausesToTell_;
     isWoken_ = true;
-    changed_.notify_all();
   }
+  changed_.notify_all();
 }
 
 void LineIntake::OnSilence(int timeoutMs) {

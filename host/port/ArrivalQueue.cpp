@@ -12,10 +12,13 @@ void ArrivalQueue::Push(ArrivedBlock block) {
   if (block.bytes.empty()) {
     return;
   }
-  const std::lock_guard<std::mutex> lock(mutex_);
-  const std::size_t cost = CostOf(block);
-  blocks_.push_back(std::move(block));
-  heldBytes_ += cost;
+  {
+    const std::lock_guard<std::mutex> lock(mutex_);
+    const std::size_t cost = CostOf(block);
+    blocks_.push_back(std::move(block));
+    heldBytes_ += cost;
+  }
+  // With the mutex free: the receiver would wake up only to wait for it.
   changed_.notify_one();
 }
 
