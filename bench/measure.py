@@ -4,10 +4,12 @@
 Called by scripts/bench.sh, which builds and installs what is needed first.
 """
 import argparse
+import atexit
 import json
 import mmap
 import os
 import random
+import signal
 import statistics
 import struct
 import subprocess
@@ -94,6 +96,8 @@ class Run:
         command = program + [self.line.path, self.stamp_file, progress] + list(more)
         begin = time.monotonic_ns()
         self.process = subprocess.Popen(command, stdout=subprocess.PIPE, text=True)
+        # However this ends, no reader goes on and takes time from the next run.
+        atexit.register(self.process.kill)
         ready = self.process.stdout.readline()
         self.start_ms = (time.monotonic_ns() - begin) / 1e6
         if ready != "ready\n":
@@ -148,6 +152,7 @@ class Run:
         if self.process.poll() is None:
             self.process.kill()
             self.process.wait()
+        atexit.unregister(self.process.kill)
         self.process.stdout.close()
         self.line.close()
         self.folder.cleanup()
@@ -367,6 +372,7 @@ def profile(build, is_quick):
 
 
 def main():
+    signal.signal(signal.SIGTERM, lambda *_: sys.exit(1))
     parser = argparse.ArgumentParser(description=__doc__)
     parser.add_argument("--build", default="build/release", help="build folder with the readers")
     parser.add_argument("--quick", action="store_true", help="few rounds: shows that all of it runs")

@@ -5,6 +5,9 @@
 #include <unistd.h>
 
 #include <array>
+#include <cerrno>
+#include <cstdio>
+#include <cstdlib>
 #include <mutex>
 #include <utility>
 
@@ -41,6 +44,11 @@ class PlainPort final : public ISerialPort {
       return false;
     }
     const ssize_t count = read(line_, buffer_.data(), buffer_.size());
+    if (count == 0 || (count < 0 && errno != EAGAIN && errno != EINTR)) {
+      // Asking a line that has ended again and again would keep a processor busy for good.
+      std::perror("the line has ended");
+      std::_Exit(5);
+    }
     next_ = 0;
     end_ = count > 0 ? static_cast<std::size_t>(count) : 0;
     return end_ != 0;
