@@ -9,7 +9,6 @@
 #include <atomic>
 #include <iostream>
 #include <map>
-#include <mutex>
 #include <string>
 #include <thread>
 
@@ -35,10 +34,13 @@ struct Service : Object<Interface> {
   const char* GetImpName() const override { return "MinimalHost"; }
   int GetImpVersion() const override { return 100; }
 };
-struct Semaphore : Object<ISemaphore> {
-  int Lock() override { return mutex.lock(), 1; }
-  int Unlock() override { return mutex.unlock(), 1; }
-  std::mutex mutex;
+struct Semaphore : Object<ISemaphore> {  // first come, first served, as it must be
+  int Lock() override {
+    for (const unsigned int mine = last++; mine != now;) poll(nullptr, 0, 1);
+    return 1;
+  }
+  int Unlock() override { return ++now, 1; }
+  std::atomic<unsigned int> last{0}, now{0};
 };
 struct Task : Object<ITask> {
   explicit Task(ITaskRunner* itsRunner) : runner(itsRunner) {}
@@ -53,8 +55,7 @@ struct Task : Object<ITask> {
 struct MultiTask : Service<IMultiTask2> {
   int StopTask(ITask* task, int /*timeoutMs*/) override {
     static_cast<Task*>(task)->isToEnd = true;
-    delete task;  // waits; a real host gives up after timeoutMs and answers 0
-    return 1;
+    return delete task, 1;  // waits; a real host gives up after timeoutMs and answers 0
   }
   ISemaphore* CreateSemaphore(int /*reserved*/) override { return new Semaphore; }
   void DeleteSemaphore(ISemaphore* semaphore) override { delete semaphore; }
@@ -130,9 +131,8 @@ int main(int argc, char** argv) {
   for (int left = isStarted ? std::stoi(argv[3]) : 0; left > 0; --left) {
     unsigned int count = 0;
     unsigned char text[1000] = {};
-    while (protocol->Read(available, reinterpret_cast<unsigned char*>(&count)) == 0 || count == 0) {
+    while (protocol->Read(available, reinterpret_cast<unsigned char*>(&count)) == 0 || count == 0)
       host.multiTask.Sleep(10);
-    }
     (void)protocol->Read(token, text);
     std::cout << reinterpret_cast<const char*>(text) << std::endl;
     (void)protocol->Write(acknowledge, reinterpret_cast<const unsigned char*>("\1"));
