@@ -73,7 +73,7 @@ class ClockFaults : public testing::Test {
     return timeUs;
   }
 
-  const RunBench bench_;
+  RunBench bench_;
   const PseudoTerminal line_;
   const SettableClock clock_{bench_.File("clock")};
   std::string notes_;
