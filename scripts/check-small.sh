@@ -9,7 +9,7 @@ need_packages g++ cmake ninja-build zlib1g-dev libcli11-dev nlohmann-json3-dev b
 folder=$project_dir/build/small
 
 say "Building the smallest loka"
-without=(-DLOKA_BUILD_TESTS=OFF)
+without=(-DLOKA_BUILD_TESTS=OFF -DCMAKE_UNITY_BUILD=ON -DCMAKE_UNITY_BUILD_BATCH_SIZE=10)
 for part in STORE DESCRIPTION TERM LOG; do without+=("-DLOKA_WITH_$part=OFF"); done
 for package in SQLite3 pugixml PkgConfig spdlog GTest; do
   without+=("-DCMAKE_DISABLE_FIND_PACKAGE_$package=ON")

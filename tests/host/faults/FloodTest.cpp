@@ -10,12 +10,17 @@
 #include "host/port/PseudoTerminal.h"
 #include "tests/host/faults/MemoryOf.h"
 #include "tests/host/faults/RunBench.h"
+#include "tests/support/Sanitized.h"
 
 namespace {
 
 using Json = nlohmann::json;
 
-constexpr long kMemoryLimitKib = 200L * 1024;  // with room for a sanitizer's own
+#ifdef LOKA_SANITIZED
+constexpr long kMemoryLimitKib = 1024L * 1024;  // a sanitizer keeps what was given back
+#else
+constexpr long kMemoryLimitKib = 100L * 1024;
+#endif
 
 // Sends numbered tokens for as long as it lives.
 class EndlessDevice {
