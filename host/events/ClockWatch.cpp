@@ -4,12 +4,12 @@
 #include <cstdlib>
 #include <ctime>
 
+#include "host/base/Nanoseconds.h"
 #include "host/events/WallClock.h"
 
 namespace {
 
 constexpr std::int64_t kUsPerSecond = 1000000;
-constexpr std::int64_t kNsPerUs = 1000;
 
 std::int64_t BootTimeUs() {
   timespec now{};
