@@ -27,9 +27,9 @@ fi
 
 say "What it does"
 scratch=$(mktemp -d)
-trap 'kill "$device" 2>/dev/null; rm -rf "$scratch"' EXIT
 "$folder/loka" sim scale --every 50 --link "$scratch/scale" >/dev/null &
 device=$!
+trap 'kill "$device" || true; rm -rf "$scratch"' EXIT
 for _ in $(seq 100); do [ -e "$scratch/scale" ] && break || sleep 0.05; done
 token=$("$folder/loka" sub "$scratch/scale" --rx-prefix STX --rx-suffix ETX -j -q -C 1 -W 20)
 echo "$token"
