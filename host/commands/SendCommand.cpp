@@ -16,9 +16,64 @@ namespace {
 
 constexpr std::size_t kMaxPayloadBytes = std::size_t{256} * 1024;
 
+constexpr int kSentLimitMs = 2000;  // an empty token without prefix and suffix is never told of
+
 Answer SendBytes(Instance* instance, const std::string& bytes) {
   return instance->Call({{"op", "send"}, {"hex", CompactHex(bytes)}});
 }
+
+// Shows what goes out, and what else happens meanwhile; tokens stay with those who read them.
+class SentPrinter final : public EventSink {
+ public:
+  explicit SentPrinter(const PrintOptions& options) : printer_(options) {}
+
+  void OnEvent(const HostEvent& event) override {
+    isSent_ = isSent_ || std::holds_alternative<BytesSent>(event.detail);
+    if (!std::holds_alternative<TokenReceived>(event.detail)) {
+      printer_.OnEvent(event);
+    }
+  }
+
+  void Forget() { isSent_ = false; }
+  bool IsSent() const { return isSent_; }
+
+ private:
+  EventPrinter printer_;
+  bool isSent_ = false;
+};
+
+// Sends, and with -v shows the bytes as they go out.
+class Sender {
+ public:
+  Sender(Instance* instance, const InstanceAccess& access)
+      : instance_(instance), isShown_(access.verbosity > 0), printer_(PrintOptionsOf(access)) {}
+
+  Answer Send(const std::string& bytes) {
+    Answer answer = isShown_ ? instance_->Subscribe() : Answer();
+    if (answer.IsDone()) {
+      answer = SendBytes(instance_, bytes);
+    }
+    if (answer.IsDone() && isShown_) {
+      printer_.Forget();
+      const Answer shown = instance_->Serve(
+          &printer_, [this] { return printer_.IsSent(); }, Deadline::After(kSentLimitMs));
+      return shown.status == ExitStatus::kTimeout ? answer : shown;
+    }
+    return answer;
+  }
+
+ private:
+  static PrintOptions PrintOptionsOf(const InstanceAccess& access) {
+    PrintOptions print;
+    print.verbosity = access.verbosity;
+    print.colour = access.colour;
+    return print;
+  }
+
+  Instance* const instance_;
+  const bool isShown_;
+  SentPrinter printer_;
+};
 
 bool ReadAll(std::istream* stream, std::string* bytes, std::string* error) {
   bytes->assign(std::istreambuf_iterator<char>(*stream), std::istreambuf_iterator<char>());
@@ -42,13 +97,13 @@ bool ReadFile(const std::string& path, std::string* bytes, std::string* error) {
 }
 
 // Every line of standard input as a token of its own, without its line end (LF or CR LF).
-Answer SendLines(Instance* instance) {
+Answer SendLines(const Instance& instance, Sender* sender) {
   std::string line;
-  while (instance->StopSignal() == 0 && std::getline(std::cin, line)) {
+  while (instance.StopSignal() == 0 && std::getline(std::cin, line)) {
     if (!line.empty() && line.back() == '\r') {
       line.pop_back();
     }
-    Answer answer = SendBytes(instance, line);
+    Answer answer = sender->Send(line);
     if (!answer.IsDone()) {
       return answer;
     }
@@ -102,7 +157,8 @@ int RunSend(SendOptions* options) {
   if (instance == nullptr) {
     return TellAnswer(answer);
   }
-  answer = options->isByLine ? SendLines(instance.get()) : SendBytes(instance.get(), bytes);
+  Sender sender(instance.get(), options->access);
+  answer = options->isByLine ? SendLines(*instance, &sender) : sender.Send(bytes);
   return EndOf(*instance, answer);
 }
 
@@ -147,6 +203,8 @@ int RunAsk(AskOptions* options) {
   }
   PrintOptions print;
   print.isQuiet = options->access.isQuiet;
+  print.verbosity = options->access.verbosity;
+  print.colour = options->access.colour;
   print.form = options->isJson  ? PrintOptions::Form::kJson
                : options->isHex ? PrintOptions::Form::kHex
                                 : PrintOptions::Form::kText;

@@ -186,6 +186,47 @@ TEST(SendCommand, FramesAndSends) {
   EXPECT_TRUE(Holds(zero.errors, "hex_tokens=true")) << zero.errors;
 }
 
+TEST(SendCommand, ShowsWhatGoesOutWhenItIsVerbose) {
+  const PseudoTerminal line;
+  ProgramRun own(With({"send", "-v", "-m", "R"}, line.Path(), "tx_suffix=0D"));
+  EXPECT_EQ(own.Status(), 0);
+  EXPECT_EQ(own.Output(), "");
+  EXPECT_TRUE(Holds(own.Errors(), "loka: tx 52 0D  \"R\\r\"\n")) << own.Errors();
+
+  InstanceRun instance("tx_prefix=02 rx_suffix=03");
+  ASSERT_TRUE(instance.IsReady()) << instance.Errors();
+  ASSERT_TRUE(instance.DeviceSends("waits\x03", "1"));
+  const InstanceRun::Result attached = instance.Loka({"send", "-vv", "-m", "AB"});
+  EXPECT_EQ(attached.status, 0);
+  EXPECT_EQ(attached.output, "");
+  EXPECT_TRUE(Holds(attached.errors, "loka: tx 02 41 42  \"\\x02")) << attached.errors;
+  EXPECT_EQ(instance.Output({"read", "0?tokens_available?unsignedInt"}), "1\n");
+  EXPECT_FALSE(Holds(instance.Loka({"send", "-m", "AB"}).errors, "tx "));
+}
+
+TEST(SendCommand, ShowsEachLineThatGoesOut) {
+  InstanceRun instance("tx_suffix=0D");
+  ASSERT_TRUE(instance.IsReady()) << instance.Errors();
+  const auto send = instance.Begin({"send", "-v", "-l"});
+  ASSERT_TRUE(send->Type("A"));
+  EXPECT_TRUE(send->AwaitErrors("loka: tx 41 0D  \"A\\r\"\n")) << send->Errors();
+  ASSERT_TRUE(send->Type("B"));
+  EXPECT_TRUE(send->AwaitErrors("loka: tx 42 0D  \"B\\r\"\n")) << send->Errors();
+}
+
+TEST(AskCommand, ShowsBothDirectionsWhenItIsVerbose) {
+  InstanceRun instance("tx_suffix=0D rx_suffix=03", "auto");
+  ASSERT_TRUE(instance.IsReady()) << instance.Errors();
+  const auto ask = instance.Begin({"ask", "-vv", "-m", "R", "-W", "20"});
+  std::string bytes;
+  ASSERT_TRUE(instance.Line().Receive(2, ProgramRun::Limit(), &bytes));
+  ASSERT_TRUE(instance.Line().Send("5\x03", ProgramRun::Limit()));
+  EXPECT_EQ(ask->Output(), "5\n");
+  EXPECT_EQ(ask->Status(), 0);
+  EXPECT_TRUE(Holds(ask->Errors(), "loka: tx 52 0D  \"R\\r\"\n")) << ask->Errors();
+  EXPECT_TRUE(Holds(ask->Errors(), "loka: 35 body  03 suffix\n")) << ask->Errors();
+}
+
 TEST(AskCommand, PrintsTheNextToken) {
   InstanceRun instance("tx_suffix=0D rx_suffix=03", "auto");
   ASSERT_TRUE(instance.IsReady()) << instance.Errors();
