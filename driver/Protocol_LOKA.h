@@ -88,7 +88,7 @@ class Protocol_LOKA : public ProtocolBase {
 
   // receiving
   void ReceivePass();
-  SerialLink::ReceiveResult ReceiveByte(unsigned char& byte, int timeoutMs);
+  inline SerialLink::ReceiveResult ReceiveByte(unsigned char& byte, int timeoutMs);
   void QueueToken(std::string_view token);
   void addToken(std::string_view token);
 
