@@ -14,12 +14,44 @@ void TokenFramer::Begin(const RxFraming& framing) {
   prefix_ = framing.prefix;
   suffix_ = framing.suffix;
   const std::string_view mark = suffix_.empty() ? prefix_ : suffix_;
-  hasEnd_ = !mark.empty();
-  endByte_ = hasEnd_ ? static_cast<unsigned char>(mark.back()) : 0;
+  endByte_ = mark.empty() ? kNoEndByte : static_cast<unsigned char>(mark.back());
   matched_ = 0;
-  begin_ = 0;
-  end_ = 0;
+  begin_ = storage_.data();
+  end_ = begin_;
+  SetStop();
   token_ = {};
+}
+
+// Until the prefix is there, every byte stops.
+void TokenFramer::SetStop() {
+  if (matched_ < prefix_.size() || GatheredBytes() >= kMaxGatheredBytes) {
+    stop_ = end_;
+    return;
+  }
+  const auto roomBytes = static_cast<std::size_t>(StorageEnd() - begin_);
+  stop_ = begin_ + std::min(roomBytes, kMaxGatheredBytes);
+}
+
+TokenFramer::Result TokenFramer::OnByteAtStop(unsigned char byte) {
+  if (matched_ < prefix_.size()) {
+    MatchPrefix(byte);
+    SetStop();
+    return Result::kMore;
+  }
+  const bool isFull = GatheredBytes() >= kMaxGatheredBytes;
+  Append(byte);
+  SetStop();
+  if (byte == endByte_) {
+    return OnEndByte();
+  }
+  return isFull ? Result::kDropped : Result::kMore;
+}
+
+void TokenFramer::Append(unsigned char byte) {
+  if (end_ == StorageEnd()) {
+    MakeRoom();
+  }
+  *end_++ = static_cast<char>(byte);
 }
 
 // Moves what is gathered to the front, into more memory when that alone makes no room.
@@ -27,13 +59,13 @@ void TokenFramer::MakeRoom() {
   const std::size_t gathered = GatheredBytes();
   if (storage_.size() < 2 * gathered || storage_.empty()) {
     std::vector<char> larger(std::max(kStorageBytesAtFirst, 2 * storage_.size()));
-    std::copy_n(storage_.begin() + static_cast<std::ptrdiff_t>(begin_), gathered, larger.begin());
+    std::copy_n(begin_, gathered, larger.begin());
     storage_.swap(larger);
   } else {
-    std::memmove(storage_.data(), storage_.data() + begin_, gathered);
+    std::memmove(storage_.data(), begin_, gathered);
   }
-  begin_ = 0;
-  end_ = gathered;
+  begin_ = storage_.data();
+  end_ = begin_ + gathered;
 }
 
 // A byte that does not fit starts the match again at itself; bytes before it are not looked at
@@ -61,6 +93,7 @@ TokenFramer::Result TokenFramer::OnEndByte() {
   } else if (EndsWith(prefix_)) {
     token_ = Cut(prefix_.size());
     begin_ = end_ - prefix_.size();
+    SetStop();
     // The next token begins with its prefix gathered, which may be too much by itself.
     return prefix_.size() > kMaxGatheredBytes ? Result::kToken : Result::kTokenAndMore;
   }
@@ -77,7 +110,7 @@ bool TokenFramer::OnSilence() {
 
 bool TokenFramer::EndsWith(std::string_view mark) const {
   return GatheredBytes() >= mark.size() &&
-         std::memcmp(storage_.data() + end_ - mark.size(), mark.data(), mark.size()) == 0;
+         std::memcmp(end_ - mark.size(), mark.data(), mark.size()) == 0;
 }
 
 // What lies between the prefix and the last `behindBytes` bytes. Framing marks may overlap (prefix
@@ -87,5 +120,5 @@ std::string_view TokenFramer::Cut(std::size_t behindBytes) const {
   if (GatheredBytes() <= framingBytes) {
     return {};
   }
-  return {storage_.data() + begin_ + prefix_.size(), GatheredBytes() - framingBytes};
+  return {begin_ + prefix_.size(), GatheredBytes() - framingBytes};
 }

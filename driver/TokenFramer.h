@@ -31,22 +31,22 @@ class TokenFramer {
   // The most bytes, framing included, that may gather without making a token.
   static constexpr std::size_t kMaxGatheredBytes = 1000;
 
+  TokenFramer() = default;
+  TokenFramer(const TokenFramer&) = delete;
+  TokenFramer& operator=(const TokenFramer&) = delete;
+
   // Starts a pass with nothing received. `framing` stays owned by the caller, unchanged until the
   // next Begin.
   void Begin(const RxFraming& framing);
 
   // Takes one byte. Throws std::bad_alloc.
   Result OnByte(unsigned char byte) {
-    if (matched_ < prefix_.size()) {
-      MatchPrefix(byte);
-      return Result::kMore;
+    if (end_ == stop_) {
+      return OnByteAtStop(byte);
     }
-    Append(byte);
+    *end_++ = static_cast<char>(byte);
     // The last byte of what ends a token decides most of the time.
-    if (byte == endByte_ && hasEnd_) {
-      return OnEndByte();
-    }
-    return GatheredBytes() > kMaxGatheredBytes ? Result::kDropped : Result::kMore;
+    return byte == endByte_ ? OnEndByte() : Result::kMore;
   }
 
   // Takes a silence, which ends the pass. True when it made a token.
@@ -57,16 +57,16 @@ class TokenFramer {
   std::string_view Token() const { return token_; }
 
  private:
-  void Append(unsigned char byte) {
-    if (end_ == storage_.size()) {
-      MakeRoom();
-    }
-    storage_[end_++] = static_cast<char>(byte);
-  }
-  std::size_t GatheredBytes() const { return end_ - begin_; }
+  static constexpr int kNoEndByte = -1;
 
-  void MakeRoom();
+  std::size_t GatheredBytes() const { return static_cast<std::size_t>(end_ - begin_); }
+  const char* StorageEnd() const { return storage_.data() + storage_.size(); }
+
+  Result OnByteAtStop(unsigned char byte);
   void MatchPrefix(unsigned char byte);
+  void SetStop();
+  void Append(unsigned char byte);
+  void MakeRoom();
   Result OnEndByte();
   bool EndsWith(std::string_view mark) const;
   std::string_view Cut(std::size_t behindBytes) const;
@@ -74,14 +74,16 @@ class TokenFramer {
   // Of the framing.
   std::string_view prefix_;
   std::string_view suffix_;
-  bool hasEnd_ = false;  // a suffix, or else a prefix, ends tokens; this is its last byte
-  unsigned char endByte_ = 0;
+  int endByte_ =
+      kNoEndByte;  // the last byte of the suffix, or else of the prefix, that ends tokens
 
   std::size_t matched_ = 0;  // bytes of the prefix that have matched
-  // Everything received and not dropped, framing included, is storage_ from begin_ to end_. A token
-  // that is followed by the next one's prefix stays in front of begin_.
+  // Everything received and not dropped, framing included, is from begin_ to end_ in storage_. A
+  // token that is followed by the next one's prefix stays in front of begin_. Where end_ meets
+  // stop_, more is to be looked at than the byte: the prefix, the room, the most that may gather.
   std::vector<char> storage_;
-  std::size_t begin_ = 0;
-  std::size_t end_ = 0;
+  char* begin_ = nullptr;
+  char* end_ = nullptr;
+  char* stop_ = nullptr;
   std::string_view token_;
 };

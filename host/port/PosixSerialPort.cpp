@@ -133,14 +133,20 @@ int PosixSerialPort::Receive(unsigned char* byte, int timeoutMs, int /*reserved*
     return 0;
   }
   if (next_ == block_.bytes.size()) {
-    const CallGuard guard(&callsInside_);
-    ReportServed();
-    if (observer_ != nullptr) {
-      observer_->OnReceivePause(progress_);
-    }
-    if (!AwaitBlock(std::max(timeoutMs, 1) * kNsPerMs)) {
-      return AnswerSilence(timeoutMs);
-    }
+    return ReceiveFromNextBlock(byte, timeoutMs);
+  }
+  *byte = static_cast<unsigned char>(block_.bytes[next_++]);
+  return 1;
+}
+
+int PosixSerialPort::ReceiveFromNextBlock(unsigned char* byte, int timeoutMs) {
+  const CallGuard guard(&callsInside_);
+  ReportServed();
+  if (observer_ != nullptr) {
+    observer_->OnReceivePause(progress_);
+  }
+  if (!AwaitBlock(std::max(timeoutMs, 1) * kNsPerMs)) {
+    return AnswerSilence(timeoutMs);
   }
   *byte = static_cast<unsigned char>(block_.bytes[next_++]);
   return 1;

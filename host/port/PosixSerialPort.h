@@ -116,6 +116,7 @@ class PosixSerialPort final : public ISerialPort {
   };
 
   // PosixSerialPort.cpp: receiving thread.
+  int ReceiveFromNextBlock(unsigned char* byte, int timeoutMs);
   bool AwaitBlock(std::int64_t timeoutNs);
   bool TakeBlock(std::int64_t timeoutNs, bool* isLate);
   void LookAtLine(const Waited& waited);

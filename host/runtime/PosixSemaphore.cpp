@@ -75,14 +75,15 @@ void OrderEverywhere() { (void)syscall(SYS_membarrier, MEMBARRIER_CMD_PRIVATE_EX
 // The other half of it, in the thread that is ordered: keeps the compiler from changing the order.
 void KeepOrder() { std::atomic_signal_fence(std::memory_order_seq_cst); }
 
-// A number of its own for each thread, never used again.
-std::uint32_t ThisThread() {
+// A number of its own for each thread, never used again; 0 until it takes its first semaphore. Part
+// of the program itself, so that no call is needed to find it.
+[[gnu::tls_model("initial-exec")]] thread_local std::uint32_t thisThread = 0;
+
+void NumberThisThread() {
   static std::atomic<std::uint32_t> lastThread{0};
-  thread_local std::uint32_t number = 0;
-  if (number == 0) {
-    number = lastThread.fetch_add(1) + 1;
+  if (thisThread == 0) {
+    thisThread = lastThread.fetch_add(1) + 1;
   }
-  return number;
 }
 
 static_assert(sizeof(std::atomic<std::uint32_t>) == sizeof(std::uint32_t),
@@ -98,33 +99,54 @@ void* PosixSemaphore::ConvertTo(const char* name) {
   return isOurs ? this : nullptr;
 }
 
+// The favourite's way, taken for every received byte. A thread without a number is nobody's
+// favourite.
 int PosixSemaphore::Lock() {
-  const std::uint32_t thread = ThisThread();
-  if (!LockAsFavourite(thread)) {
-    AwaitTurn(nextTicket_.fetch_add(1));
-    EndFavour();
-    NoteTurn(thread);
-    isHeldByFavour_ = false;
-  }
-  return 1;
-}
-
-bool PosixSemaphore::LockAsFavourite(std::uint32_t thread) {
   Favour* const favour = favourite_.load(std::memory_order_acquire);
-  if (favour == nullptr || favour->thread.load(std::memory_order_relaxed) != thread) {
-    return false;
+  if (favour == nullptr || favour->thread.load(std::memory_order_relaxed) != thisThread) {
+    return LockByTicket();
   }
   favour->isHolding.store(1, std::memory_order_relaxed);
   KeepOrder();
-  if (nextTicket_.load(std::memory_order_acquire) ==
+  if (nextTicket_.load(std::memory_order_acquire) !=
       favour->ticket.load(std::memory_order_relaxed)) {
-    isHeldByFavour_ = true;
-    return true;
+    return QueueAsFavourite(favour);
   }
-  // Somebody has drawn a number and may be waiting for this.
-  favour->isHolding.store(0, std::memory_order_release);
-  FutexWake(&favour->isHolding, kEveryBit);
-  return false;
+  heldFavour_ = favour;
+  return 1;
+}
+
+// Somebody has drawn a number and may be waiting for the favourite.
+[[gnu::noinline]] int PosixSemaphore::QueueAsFavourite(Favour* favour) {
+  favour->isHolding.store(0);
+  Wake(favour->isHolding, kEveryBit);
+  return LockByTicket();
+}
+
+int PosixSemaphore::LockByTicket() {
+  NumberThisThread();
+  AwaitTurn(nextTicket_.fetch_add(1));
+  EndFavour();
+  NoteTurn(thisThread);
+  return 1;
+}
+
+// Sleeps while the word has the value that was seen in it.
+void PosixSemaphore::Sleep(const std::atomic<std::uint32_t>& word, std::uint32_t seen,
+                           std::uint32_t bit) {
+  sleepers_.fetch_add(1);
+  FutexWait(&word, seen, bit);
+  sleepers_.fetch_sub(1);
+}
+
+// Behind a change of the word that is ordered before the look at the sleepers: whoever is not among
+// them yet will see the change before it falls asleep. Most who wait only look. Never part of its
+// callers, whose usual way has no call in it.
+[[gnu::noinline]] void PosixSemaphore::Wake(const std::atomic<std::uint32_t>& word,
+                                            std::uint32_t bit) {
+  if (sleepers_.load() != 0) {
+    FutexWake(&word, bit);
+  }
 }
 
 void PosixSemaphore::AwaitTurn(std::uint32_t ticket) {
@@ -137,7 +159,7 @@ void PosixSemaphore::AwaitTurn(std::uint32_t ticket) {
     if (isNext && LooksFor(nowServing_, [=](std::uint32_t now) { return now == ticket; })) {
       return;
     }
-    FutexWait(&nowServing_, serving, WakeBit(ticket));
+    Sleep(nowServing_, serving, WakeBit(ticket));
   }
 }
 
@@ -153,7 +175,7 @@ void PosixSemaphore::EndFavour() {
     if (LooksFor(favour->isHolding, [](std::uint32_t isHolding) { return isHolding == 0; })) {
       break;
     }
-    FutexWait(&favour->isHolding, 1, kEveryBit);
+    Sleep(favour->isHolding, 1, kEveryBit);
   }
   favourite_.store(nullptr);
   if (turnsToFavour_ < kMostTurnsToFavour) {
@@ -183,10 +205,24 @@ void PosixSemaphore::Grant(std::uint32_t nextTicket) {
   }
 }
 
+// The favourite's way again.
 int PosixSemaphore::Unlock() {
-  if (isHeldByFavour_) {
-    return UnlockAsFavourite();
+  Favour* const favour = heldFavour_;
+  if (favour == nullptr) {
+    return UnlockByTicket();
   }
+  heldFavour_ = nullptr;
+  const std::uint32_t ticket = favour->ticket.load(std::memory_order_relaxed);
+  favour->isHolding.store(0, std::memory_order_release);
+  KeepOrder();
+  if (nextTicket_.load(std::memory_order_relaxed) != ticket) {
+    std::atomic_thread_fence(std::memory_order_seq_cst);
+    Wake(favour->isHolding, kEveryBit);
+  }
+  return 1;
+}
+
+int PosixSemaphore::UnlockByTicket() {
   const std::uint32_t serving = nowServing_.load();
   if (nextTicket_.load() == serving) {
     return 0;
@@ -198,21 +234,7 @@ int PosixSemaphore::Unlock() {
   // the new turn, or it would sleep with nobody left to wake it.
   nowServing_.store(serving + 1);
   if (nextTicket_.load() != serving + 1) {
-    FutexWake(&nowServing_, WakeBit(serving + 1));
-  }
-  return 1;
-}
-
-int PosixSemaphore::UnlockAsFavourite() {
-  Favour* const favour = favourite_.load(std::memory_order_relaxed);
-  if (favour == nullptr || favour->isHolding.load(std::memory_order_relaxed) == 0) {
-    return 0;
-  }
-  const std::uint32_t ticket = favour->ticket.load(std::memory_order_relaxed);
-  favour->isHolding.store(0, std::memory_order_release);
-  KeepOrder();
-  if (nextTicket_.load(std::memory_order_relaxed) != ticket) {
-    FutexWake(&favour->isHolding, kEveryBit);
+    Wake(nowServing_, WakeBit(serving + 1));
   }
   return 1;
 }

@@ -60,8 +60,11 @@ class PosixSemaphore final : public ISemaphore {
     std::atomic<std::uint32_t> isHolding{0};  // 1 while the thread holds the semaphore by it
   };
 
-  bool LockAsFavourite(std::uint32_t thread);
-  int UnlockAsFavourite();
+  int LockByTicket();
+  int QueueAsFavourite(Favour* favour);
+  int UnlockByTicket();
+  void Sleep(const std::atomic<std::uint32_t>& word, std::uint32_t seen, std::uint32_t bit);
+  void Wake(const std::atomic<std::uint32_t>& word, std::uint32_t bit);
   void AwaitTurn(std::uint32_t ticket);
   void EndFavour();
   void NoteTurn(std::uint32_t thread);
@@ -69,12 +72,13 @@ class PosixSemaphore final : public ISemaphore {
 
   std::atomic<std::uint32_t> nextTicket_{0};
   std::atomic<std::uint32_t> nowServing_{0};
+  std::atomic<std::uint32_t> sleepers_{0};  // threads that sleep in the kernel, or are about to
 
   // Set by the holder of a ticket as it lets go, cleared by the next holder of one.
   std::atomic<Favour*> favourite_{nullptr};
 
   // Of whoever holds the semaphore.
-  bool isHeldByFavour_ = false;
+  Favour* heldFavour_ = nullptr;  // null when it is held by ticket
   std::uint32_t lastThread_ = 0;  // by ticket
   std::uint32_t turns_ = 0;
   std::uint32_t turnsToFavour_ = kTurnsToFavour;
