@@ -1,6 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #include <gtest/gtest.h>
 
+#include <chrono>
 #include <cstdint>
 #include <string>
 #include <thread>
@@ -162,6 +163,26 @@ TEST(PosixSemaphore, FavouriteStandsBehindTheOneThatWaits) {
     }
     ASSERT_EQ(TurnsBesideAWaiter(semaphore), "awa");
     EXPECT_FALSE(semaphore.HasFavourite());
+  }
+}
+
+TEST(PosixSemaphore, WakesWhoHasFallenAsleepBehindATurnAndBehindAFavourite) {
+  constexpr std::chrono::milliseconds kLongerThanAnybodyLooks(50);
+  for (const bool isByFavour : {false, true}) {
+    PosixSemaphore semaphore;
+    if (isByFavour) {
+      BecomeFavourite(semaphore);
+    }
+    semaphore.Lock();
+    std::thread second([&] {
+      semaphore.Lock();
+      semaphore.Unlock();
+    });
+    AwaitUsers(semaphore, 2);
+    std::this_thread::sleep_for(kLongerThanAnybodyLooks);
+    EXPECT_EQ(semaphore.Unlock(), 1);
+    second.join();
+    EXPECT_EQ(semaphore.UserCount(), 0U);
   }
 }
 
