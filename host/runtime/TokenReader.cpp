@@ -8,7 +8,7 @@
 namespace {
 
 // The driver needs no memory of its own for a read up to this length.
-constexpr unsigned int kFirstRoomCharacters = 127;
+constexpr unsigned int kFirstRoomCharacters = 63;
 constexpr int kAttempts = 100;
 
 }  // namespace
