@@ -33,6 +33,9 @@ target_compile_options(
             -Wundef
             $<$<BOOL:${LOKA_WARNINGS_AS_ERRORS}>:-Werror>
             $<$<CXX_COMPILER_ID:Clang>:-Wthread-safety>)
+# Nobody else's functions stand in for the exported ones; the library is linked that way too.
+target_compile_options(loka_compile
+                       INTERFACE $<$<CXX_COMPILER_ID:GNU>:-fno-semantic-interposition>)
 target_link_libraries(loka_compile INTERFACE Threads::Threads)
 
 if(LOKA_SANITIZE)

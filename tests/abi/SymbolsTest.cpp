@@ -84,6 +84,14 @@ TEST(SymbolsTest, LinksTheLanguagesLibrariesOnly) {
   }
   EXPECT_GT(needed, 0) << "nothing was read";
 }
+
+// Another driver in the process may export utilities of the same names.
+TEST(SymbolsTest, UsesItsOwnUtilities) {
+  const Lines relocations =
+      RunCommand(std::string(LOKA_READELF) + " -r -W '" + PluginLibrary::DefaultPath() + "'");
+  EXPECT_TRUE(Has(relocations, "memcpy")) << "nothing was read";
+  EXPECT_FALSE(Has(relocations, "ProtUtilsN"));
+}
 #endif
 
 // The checks find what they are there for.
