@@ -34,6 +34,7 @@ class TokenFramer {
   TokenFramer() = default;
   TokenFramer(const TokenFramer&) = delete;
   TokenFramer& operator=(const TokenFramer&) = delete;
+  ~TokenFramer() = default;
 
   // Starts a pass with nothing received. `framing` stays owned by the caller, unchanged until the
   // next Begin.

@@ -9,8 +9,6 @@
 
 namespace {
 
-constexpr std::int64_t kUsPerSecond = 1000000;
-
 std::int64_t BootTimeUs() {
   timespec now{};
   (void)clock_gettime(CLOCK_BOOTTIME, &now);

@@ -10,8 +10,6 @@
 
 namespace {
 
-constexpr std::int64_t kUsPerSecond = 1000000;
-
 // Rounds down also in front of 1970, so that the rest is never negative.
 std::int64_t SecondsOf(std::int64_t timeUs) {
   const std::int64_t seconds = timeUs / kUsPerSecond;

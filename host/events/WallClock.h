@@ -6,6 +6,8 @@
 
 // Time of day, for people and for records; never for measuring. All functions: any thread.
 
+inline constexpr std::int64_t kUsPerSecond = 1'000'000;
+
 // Microseconds since 1970-01-01 UTC.
 std::int64_t WallClockUs();
 
