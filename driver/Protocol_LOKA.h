@@ -88,6 +88,7 @@ class Protocol_LOKA : public ProtocolBase {
 
   // receiving
   void ReceivePass();
+  // Part of its caller: what it costs is paid for every byte.
   inline SerialLink::ReceiveResult ReceiveByte(unsigned char& byte, int timeoutMs);
   void QueueToken(std::string_view token);
   void addToken(std::string_view token);

@@ -75,8 +75,7 @@ class TokenFramer {
   // Of the framing.
   std::string_view prefix_;
   std::string_view suffix_;
-  int endByte_ =
-      kNoEndByte;  // the last byte of the suffix, or else of the prefix, that ends tokens
+  int endByte_ = kNoEndByte;  // the last byte of what ends tokens: the suffix, or else the prefix
 
   std::size_t matched_ = 0;  // bytes of the prefix that have matched
   // Everything received and not dropped, framing included, is from begin_ to end_ in storage_. A

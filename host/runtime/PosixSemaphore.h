@@ -10,9 +10,9 @@
 
 // A host semaphore that serves strictly first come, first served: a ticket lock whose waiters sleep
 // in the kernel (futex(2)). The receive task takes its semaphore again right after letting it go; a
-// lock without an order could make everybody else wait for good. Without contention neither
-// operation makes a system call, and whoever is next looks for some microseconds whether its turn
-// comes before it goes to sleep. Not recursive.
+// lock without an order could make everybody else wait for good. Whoever is next looks for some
+// microseconds whether its turn comes before it goes to sleep, and neither operation makes a system
+// call unless somebody sleeps. Not recursive.
 //
 // The favourite. A thread that has taken the semaphore many times with nobody in between becomes
 // its favourite and draws no more numbers: it says that it holds the semaphore and looks whether
