@@ -63,7 +63,7 @@ write_set "beside() { check two bash -c 'echo \$\$ >\"$folder/beside_id\"; exec 
 begin_beside 1 beside; check one sleep 1; await_beside; give_verdict"
 TMPDIR=$folder bash "$folder/set.sh" >/dev/null 2>&1 &
 set_job=$!
-for _ in $(seq 200); do [ -s "$folder/beside_id" ] && break || sleep 0.05; done
+for _ in $(seq 600); do [ -s "$folder/beside_id" ] && break || sleep 0.05; done
 beside_id=$(cat "$folder/beside_id")
 kill "$set_job"
 status=0
