@@ -10,6 +10,8 @@
 #include <cstdlib>
 #include <mutex>
 
+#include "host/base/Deadline.h"
+
 namespace {
 
 // Ends of the program that no destructor sees.
@@ -37,6 +39,19 @@ void PutBack() {
   }
 }
 
+// The thread that edits lines goes on until the process ends, and may be about to set what it had
+// read before.
+void PutBackForGood() {
+  constexpr int kLongerThanOneChangeMs = 20;
+  Saved& saved = TheSaved();
+  const int fileDescriptor = saved.fileDescriptor.load();
+  PutBack();
+  if (fileDescriptor >= 0) {
+    Deadline::After(kLongerThanOneChangeMs).Sleep();
+    (void)tcsetattr(fileDescriptor, TCSANOW, &saved.state);
+  }
+}
+
 // Leaves the end itself to whoever handled the signal before.
 void OnFatalSignal(int signalNumber, siginfo_t* info, void* /*context*/) {
   PutBack();
@@ -60,7 +75,7 @@ TerminalState::TerminalState(int fileDescriptor) {
     return;
   }
   static std::once_flag isRegistered;
-  std::call_once(isRegistered, [] { (void)std::at_quick_exit(PutBack); });
+  std::call_once(isRegistered, [] { (void)std::at_quick_exit(PutBackForGood); });
   saved.fileDescriptor = fileDescriptor;
   struct sigaction action {};
   action.sa_sigaction = OnFatalSignal;
